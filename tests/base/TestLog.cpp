@@ -1,0 +1,113 @@
+#include "lib/base/CheckedMalloc.h"
+#include "lib/base/Log.h"
+#include "lib/base/LogLimit.h"
+#include "tests/support/ScratchHome.h"
+
+#include <chrono>
+#include <csignal>
+#include <cstdint>
+#include <gtest/gtest.h>
+#include <regex>
+#include <sstream>
+#include <thread>
+#include <vector>
+
+namespace fs = std::filesystem;
+
+/// Lets a refused allocation answer null under the address sanitizer, as malloc does without it.
+extern "C" const char* __asan_default_options() {
+    return "allocator_may_return_null=1";
+}
+
+namespace {
+
+void put(const std::string& path, const std::string& text) {
+    fs::create_directories(fs::path(path).parent_path());
+    std::ofstream(path) << text;
+}
+
+TEST(Log, WritesDatedEntriesIntoTheUsersLibrary) {
+    const ScratchHome home;
+    Log("%s: unknown icon format '%s'\n", "here", "rgb");
+    Warning("%s\n", std::string(5000, 'x').c_str());
+
+    EXPECT_EQ(LogFilePath(-1), home.path() / "Library/Logs/Corvane Tessel/corvane-tesselStartMenu.log");
+    EXPECT_EQ(LogFilePath(3), home.path() / "Library/Logs/Corvane Tessel/corvane-tesselStartMenu-2.log");
+    const std::regex entries("[A-Z][a-z]{2} [ 123][0-9] [0-9]{2}:[0-9]{2}:[0-9]{2}\\.[0-9]{3}: "
+                             "here: unknown icon format 'rgb'\n[^\n]*: x{5000}\n");
+    EXPECT_TRUE(std::regex_match(ScratchHome::log(), entries)) << ScratchHome::log();
+}
+
+TEST(Log, EntriesOfManyThreadsStayWhole) {
+    const ScratchHome home;
+    std::vector<std::thread> threads;
+    for (char letter : {'a', 'b', 'c', 'd'})
+        threads.emplace_back([letter] {
+            for (int i = 0; i < 200; ++i)
+                Log("%s\n", std::string(300, letter).c_str());
+        });
+    for (auto& thread : threads)
+        thread.join();
+    std::istringstream lines(ScratchHome::log());
+    int count = 0;
+    for (std::string line; std::getline(lines, line); ++count)
+        EXPECT_EQ(line.substr(21), std::string(300, line.back()));
+    EXPECT_EQ(count, 800);
+}
+
+TEST(Log, DropsWhatCannotBeWritten) {
+    const ScratchHome home;
+    put(home.path() / "Library", "a file where the directory should be");
+    Log("lost\n");
+    EXPECT_EQ(ScratchHome::contents(home.path() / "Library"), "a file where the directory should be");
+}
+
+TEST(Log, RotationShiftsByOneForgetsTheOldestAndKeepsGaps) {
+    const std::pair<const char*, const char*> cases[] = {
+        {"----", "----"}, {"0123", "-012"}, {"0-2-", "-0-2"}, {"0---", "-0--"}};
+    for (const auto& [before, after] : cases) {
+        const ScratchHome home;
+        std::string found;
+        for (int index = 0; index <= 3; ++index)
+            if (before[index] != '-') put(LogFilePath(index), {before[index]});
+        RotateLogFiles();
+        for (int index = 0; index <= 3; ++index)
+            found += fs::exists(LogFilePath(index)) ? ScratchHome::log(index) : "-";
+        EXPECT_EQ(found, after);
+    }
+}
+
+TEST(CheckedMalloc, PanicsOnlyWhenThereIsNoMemory) {
+    const ScratchHome home;
+    std::free(CheckedMalloc(-1, 0, "file", 1));
+    std::free(CheckedMalloc(-1, 16, "file", 1));
+    EXPECT_FALSE(fs::exists(LogFilePath(0)));
+
+    const std::size_t tooMuch = SIZE_MAX / 4;
+    EXPECT_EXIT((void)CheckedMalloc(-1, tooMuch, "a.cpp", 7), testing::KilledBySignal(SIGABRT), "");
+    EXPECT_EXIT((void)CheckedMalloc(42, tooMuch, "b.cpp", 8), testing::KilledBySignal(SIGABRT), "");
+    const std::string log = ScratchHome::log();
+    EXPECT_NE(log.find(": Unrecoverable memory allocation failure at a.cpp:7\n"), std::string::npos) << log;
+    EXPECT_NE(log.find(": Unrecoverable memory allocation failure at b.cpp:8.  Bug number: 42\n"),
+              std::string::npos);
+    EXPECT_NE(log.find("*** Panic: Backtrace\n"), std::string::npos);
+}
+
+TEST(LogLimit, LetsTenEntriesAMinuteThrough) {
+    LogLimit limit;
+    LogLimit::Instant now{};
+    const auto allowed = [&](int processID) {
+        int count = 0;
+        for (int i = 0; i < 100; ++i)
+            count += limit.allows(processID, now);
+        return count;
+    };
+    EXPECT_EQ(allowed(1), 10);
+    EXPECT_EQ(allowed(2), 10);
+    now += std::chrono::seconds(59);
+    EXPECT_EQ(allowed(1), 0);
+    now += std::chrono::seconds(1);
+    EXPECT_EQ(allowed(1), 10);
+}
+
+} // namespace

@@ -1,0 +1,266 @@
+#include "lib/plist/Binary.h"
+
+#include "lib/plist/Document.h"
+#include "lib/plist/Output.h"
+#include "lib/plist/Unicode.h"
+#include "lib/plist/Uniquer.h"
+#include "lib/plist/Value.h"
+
+#include <algorithm>
+#include <bit>
+#include <cstddef>
+#include <cstdint>
+#include <cstring>
+#include <span>
+#include <string>
+#include <string_view>
+#include <utility>
+#include <vector>
+
+namespace plist {
+
+namespace {
+
+using Index = Uniquer::Index;
+
+/// Data of this size or more is pointed at; below it, copying is cheaper than another piece.
+constexpr std::size_t kPieceSize = 512;
+
+/// Leaves are written as they are met; containers follow them, since the size of a reference is known only
+/// then.
+class Writer {
+public:
+    Writer(const Limits& limits, std::string& error)
+        : m_objectLimit(std::min<std::size_t>(limits.objects, UINT32_MAX / 2))
+        , m_byteLimit(limits.bytes)
+        , m_nesting(std::min(limits.nesting, kDeepestNesting))
+        , m_error(error) {}
+
+    Encoded run(const Value& value) {
+        m_out.put(std::as_bytes(std::span(std::string_view("bplist00"))));
+        Index top = 0;
+        if (!add(value, 0, top)) return {};
+        writeContainers();
+        writeTable(top);
+        if (m_out.size() <= m_byteLimit) return std::move(m_out).finish(value);
+        m_error = "the property list is too large";
+        return {};
+    }
+
+private:
+    struct Object {
+        std::size_t offset = 0; ///< in the file
+        std::size_t size = 0;   ///< of a leaf with its head, or of what stands elsewhere
+        std::size_t mark = 0;   ///< of a leaf
+        const std::byte* elsewhere = nullptr;
+    };
+    /// Where data that is pointed at stands, and the object that holds it or its like.
+    struct Place {
+        std::span<const std::byte> bytes;
+        Index object;
+    };
+    struct Container {
+        Kind kind;
+        Index object;
+        std::size_t size;
+        std::size_t references; ///< from `first` on
+        std::size_t first;
+    };
+
+    bool fail(const char* reason) {
+        m_error = reason;
+        return false;
+    }
+
+    bool count(std::size_t objects) {
+        m_visited += objects;
+        return m_visited <= m_objectLimit || fail("too many objects");
+    }
+
+    bool add(const Value& value, unsigned depth, Index& index) {
+        if (!count(1)) return false;
+        switch (value.type()) {
+        case Type::nil:
+            return fail("nil cannot stand in a property list");
+        case Type::array:
+        case Type::dictionary:
+            return addContainer(value, depth, index);
+        case Type::data:
+            index = addData(Access::bytes(value));
+            return true;
+        case Type::string:
+            return addText(Access::text(value, m_scratch), index);
+        default:
+            index = addNumber(value);
+            return true;
+        }
+    }
+
+    bool addContainer(const Value& value, unsigned depth, Index& index) {
+        if (depth == m_nesting) return fail("nested too deeply");
+        const std::size_t size = value.size();
+        const std::size_t keys = value.isDictionary() ? size : 0;
+        std::size_t at = m_references.size();
+        index = newObject({});
+        m_containers.push_back(
+            {value.isDictionary() ? Kind::dictionary : Kind::array, index, size, keys + size, at});
+        m_references.resize(at + keys + size);
+
+        if (!count(keys)) return false;
+        for (std::size_t i = 0; i < keys; ++i)
+            if (!addText(Access::keyAt(value, i, m_scratch), m_references[at++])) return false;
+        return Access::all(value, [&](const Value& element) {
+            // Not straight into the references: they move while the element adds its own.
+            Index child = 0;
+            if (!add(element, depth + 1, child)) return false;
+            m_references[at++] = child;
+            return true;
+        });
+    }
+
+    bool addText(std::string_view text, Index& index) {
+        if (!count(weightOfText(text.size()))) return false;
+        const auto bytes = std::as_bytes(std::span(text));
+        if (unicode::isASCII(bytes)) {
+            index = addLeaf(Token().putHead(Kind::ascii, bytes.size()), bytes);
+            return true;
+        }
+        m_units.clear();
+        while (!text.empty())
+            unicode::appendUTF16(m_units, unicode::takeUTF8(text));
+        index = addLeaf(Token().putHead(Kind::utf16, m_units.size() / 2), m_units);
+        return true;
+    }
+
+    Index addNumber(const Value& value) {
+        Token token;
+        switch (value.type()) {
+        case Type::boolean:
+            token.put(value.boolValue() ? 0x09 : 0x08, 1);
+            break;
+        case Type::real:
+            token.put(0x23, 1).put(std::bit_cast<std::uint64_t>(value.doubleValue()), 8);
+            break;
+        case Type::date:
+            token.put(0x33, 1).put(std::bit_cast<std::uint64_t>(value.dateValue().secondsSince2001), 8);
+            break;
+        default:
+            if (Access::isNegative(value))
+                token.put(0x13, 1).put(value.unsignedLongLongValue(), 8);
+            else
+                token.putInteger(value.unsignedLongLongValue());
+        }
+        return addLeaf(Token(), token.bytes());
+    }
+
+    Index addData(std::span<const std::byte> bytes) {
+        const Token head = Token().putHead(Kind::data, bytes.size());
+        return bytes.size() < kPieceSize ? addLeaf(head, bytes) : addPiece(head, bytes);
+    }
+
+    /// Puts head and content, unless the like of them has been put before.
+    Index addLeaf(const Token& token, std::span<const std::byte> content) {
+        const auto head = token.bytes();
+        const std::size_t size = head.size() + content.size();
+        const auto isSame = [&](Index known) {
+            const Object& object = m_objects[known];
+            return object.size == size && isAt(m_out.at(object.mark), head) &&
+                   isAt(m_out.at(object.mark) + head.size(), content);
+        };
+        const Index known = m_leaves.findOrAdd(hashOf(content), nextObject(), Uniquer::kForEver, isSame);
+        if (known != Uniquer::kNone) return known;
+        const Index index = newObject({m_out.size(), size, m_out.mark(), nullptr});
+        m_out.put(head);
+        m_out.put(content);
+        return index;
+    }
+
+    /// The same for data that is pointed at.
+    Index addPiece(const Token& head, std::span<const std::byte> bytes) {
+        const auto isThere = [&](Index known) {
+            return m_places[known].bytes.data() == bytes.data() &&
+                   m_places[known].bytes.size() == bytes.size();
+        };
+        const auto next = static_cast<Index>(m_places.size());
+        const Index place =
+            m_knownPlaces.findOrAdd(hashOf(bytes.data(), bytes.size()), next, Uniquer::kForEver, isThere);
+        if (place != Uniquer::kNone) return m_places[place].object;
+        const Index object = addContent(head, bytes);
+        m_places.push_back({bytes, object});
+        return object;
+    }
+
+    Index addContent(const Token& head, std::span<const std::byte> bytes) {
+        // Bounded: to write data twice does no harm, to compare megabytes with everything does.
+        constexpr unsigned kPatience = 4;
+        const auto isSame = [&](Index known) {
+            return m_objects[known].size == bytes.size() && isAt(m_objects[known].elsewhere, bytes);
+        };
+        const Index known = m_contents.findOrAdd(sampledHashOf(bytes), nextObject(), kPatience, isSame);
+        if (known != Uniquer::kNone) return known;
+        const Index index = newObject({m_out.size(), bytes.size(), 0, bytes.data()});
+        m_out.put(head.bytes());
+        m_out.putElsewhere(bytes);
+        return index;
+    }
+
+    static bool isAt(const std::byte* place, std::span<const std::byte> bytes) {
+        return bytes.empty() || std::memcmp(place, bytes.data(), bytes.size()) == 0;
+    }
+
+    Index nextObject() const { return static_cast<Index>(m_objects.size()); }
+    Index newObject(const Object& object) {
+        m_objects.push_back(object);
+        return static_cast<Index>(m_objects.size() - 1);
+    }
+
+    void writeContainers() {
+        const std::size_t width = referenceSize();
+        for (const Container& container : m_containers) {
+            m_objects[container.object].offset = m_out.size();
+            m_out.put(Token().putHead(container.kind, container.size).bytes());
+            std::byte* to = m_out.extend(container.references * width);
+            for (std::size_t i = 0; i < container.references; ++i)
+                to = storeNumber(to, m_references[container.first + i], width);
+        }
+    }
+
+    void writeTable(Index top) {
+        const std::size_t table = m_out.size();
+        const std::size_t width = widthFor(table);
+        std::byte* to = m_out.extend(m_objects.size() * width + Document::kTrailer);
+        for (const Object& object : m_objects)
+            to = storeNumber(to, object.offset, width);
+        to = storeNumber(to, width, 7);
+        to = storeNumber(to, referenceSize(), 1);
+        to = storeNumber(to, m_objects.size(), 8);
+        to = storeNumber(to, top, 8);
+        storeNumber(to, table, 8);
+    }
+
+    std::size_t referenceSize() const { return widthFor(m_objects.size() - 1); }
+
+    const std::size_t m_objectLimit;
+    const std::size_t m_byteLimit;
+    const unsigned m_nesting;
+    std::string& m_error;
+    Output m_out;
+    std::string m_scratch;
+    std::vector<std::byte> m_units;
+    std::vector<Object> m_objects;
+    std::vector<Container> m_containers;
+    std::vector<Index> m_references; ///< of all containers; of dictionaries the keys, then the values
+    Uniquer m_leaves;
+    std::vector<Place> m_places;
+    Uniquer m_knownPlaces;
+    Uniquer m_contents;
+    std::size_t m_visited = 0;
+};
+
+} // namespace
+
+Encoded WriteBinary(const Value& value, std::string& error, const Limits& limits) {
+    return Writer(limits, error).run(value);
+}
+
+} // namespace plist

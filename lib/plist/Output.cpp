@@ -1,0 +1,43 @@
+#include "lib/plist/Output.h"
+#include "lib/base/SharedBytes.h"
+#include "lib/plist/Binary.h"
+#include "lib/plist/Value.h"
+
+#include <cstddef>
+#include <memory>
+#include <span>
+#include <utility>
+#include <vector>
+
+namespace plist {
+
+Encoded Output::finish(const Value& holder) && {
+    struct Kept {
+        std::vector<std::byte> own;
+        Value holder;
+    };
+    Encoded encoded;
+    encoded.size = size();
+    auto kept = std::make_shared<const Kept>(Kept{std::move(m_own), holder});
+    encoded.pieces.reserve(2 * m_breaks.size() + 1);
+    const std::span<const std::byte> own = kept->own;
+    std::size_t from = 0;
+    for (const Break& each : m_breaks) {
+        encoded.pieces.push_back(own.subspan(from, each.at - from));
+        encoded.pieces.push_back(each.bytes);
+        from = each.at;
+    }
+    encoded.pieces.push_back(own.subspan(from));
+    encoded.keepAlive = std::move(kept);
+    return encoded;
+}
+
+SharedBytes Encoded::joined() const {
+    auto buffer = std::make_shared<std::vector<std::byte>>();
+    buffer->reserve(size);
+    for (const auto& piece : pieces)
+        buffer->insert(buffer->end(), piece.begin(), piece.end());
+    return {*buffer, buffer};
+}
+
+} // namespace plist

@@ -1,0 +1,184 @@
+#include "lib/plist/Binary.h"
+#include "tests/plist/RawFile.h"
+
+#include <gtest/gtest.h>
+
+#include <algorithm>
+#include <limits>
+
+namespace plist {
+
+namespace {
+
+Value reread(const Value& value, std::size_t* size = nullptr) {
+    std::string error;
+    const Encoded encoded = WriteBinary(value, error);
+    EXPECT_EQ(error, "");
+    if (size) *size = encoded.size;
+    const Value result = Parse(encoded.joined(), error);
+    EXPECT_EQ(error, "");
+    return result;
+}
+
+Data unhex(std::string_view digits) {
+    std::string bytes;
+    for (std::size_t i = 0; i < digits.size(); i += 2)
+        bytes += static_cast<char>(std::stoi(std::string(digits.substr(i, 2)), nullptr, 16));
+    return dataOf(bytes);
+}
+
+TEST(Binary, ReadsWhatAnotherWriterWrote) {
+    const Data file =
+        unhex("62706c6973743030d3010203040506546e616d655670736e4b657964006e00e9d83dde005c6d656e752e72656672"
+              "6573681400000000000000008000000000000005a60708090a0b0c13ffffffffffffffff23400000000000000033"
+              "41b647feaa0000004200ff081200011170080f141b24314249525b64676800000000000001010000000000000"
+              "00d0000000000000000000000000000006d");
+    std::string error;
+    const Value value = Parse(file, error);
+    ASSERT_EQ(error, "");
+    const Value expected =
+        Dictionary{{"name", "menu.refresh"},
+                   {"psnKey", (std::uint64_t{1} << 63) + 5},
+                   {"né😀", Array{-1, 2.0, Date{373817002}, dataOf({"\0\xFF", 2}), false, 70000}}};
+    EXPECT_EQ(value, expected) << value.description();
+    EXPECT_EQ(value["né😀"].at(2).description(), "2012-11-05 14:03:22 +0000");
+}
+
+TEST(Binary, WritesTheFormatByteForByte) {
+    std::string error;
+    const Data written = WriteBinary(Array{"a", 258, "a"}, error).joined();
+    EXPECT_EQ(written, unhex("62706c69737430305161110102a30102010d080a0000000000000101000000000000"
+                             "000300000000000000000000000000000011"));
+}
+
+TEST(Binary, NumbersSurviveAtEveryWidth) {
+    Array numbers{true, false, UINT64_MAX, 0.0, -1.5, std::numeric_limits<double>::infinity(), Date{-0.25}};
+    for (int bit = 0; bit < 64; ++bit) {
+        const std::uint64_t power = std::uint64_t{1} << bit;
+        for (const std::uint64_t number : {power - 1, power, power + 1}) {
+            numbers.push_back(number);
+            numbers.push_back(static_cast<std::int64_t>(number));
+        }
+    }
+    EXPECT_EQ(reread(numbers), Value(numbers));
+}
+
+TEST(Binary, TextSurvivesInBothEncodings) {
+    Array texts;
+    for (const std::size_t length : {0u, 1u, 7u, 8u, 9u, 15u, 16u, 255u, 256u, 70000u}) {
+        texts.push_back(std::string(length, 'x'));
+        std::string wide;
+        for (std::size_t i = 0; i < length; ++i)
+            wide += "\xF0\x9F\x98\x80";
+        texts.push_back(wide);
+        texts.push_back(std::string(length, 'x') + "\xC3\xA9");
+    }
+    texts.push_back(std::string("a\0b", 3));
+    texts.push_back(
+        "\xC2\x80\xDF\xBF\xE0\xA0\x80\xED\x9F\xBF\xEE\x80\x80\xEF\xBF\xBF\xF0\x90\x80\x80\xF4\x8F\xBF\xBF");
+    const Value again = reread(texts);
+    EXPECT_EQ(again, Value(texts));
+    for (std::size_t i = 0; i < texts.size(); ++i)
+        EXPECT_EQ(again.at(i).string(), texts[i].string());
+}
+
+TEST(Binary, MalformedTextIsReplaced) {
+    const std::string mark = "\xEF\xBF\xBD";
+    const std::pair<std::string, std::string> written[] = {
+        {"a\xFF!", "a" + mark + "!"},
+        {"\xC0\xAF", mark + mark},                       // overlong
+        {"\xED\xA0\x80", mark + mark + mark},            // a surrogate
+        {"\xF4\x90\x80\x80", mark + mark + mark + mark}, // past the last character
+        {"\xE2\x82", mark + mark},                       // cut short
+        {"\xE2\x82x", mark + mark + "x"},
+    };
+    for (const auto& [text, expected] : written)
+        EXPECT_EQ(reread(text).string(), expected);
+
+    const std::pair<std::string, std::string> units[] = {
+        {{"\x63\xD8\x00\x00x\x00y", 7}, mark + "xy"}, // a high surrogate alone
+        {{"\x62\xDC\x00\x00x", 5}, mark + "x"},       // a low one
+        {{"\x61\xD8\x3D", 3}, mark},                  // a high one at the end
+        {{"\x63\xD8\x00\xD8\x3D\xDE\x00", 7}, mark + "\xF0\x9F\x98\x80"},
+    };
+    for (const auto& [object, expected] : units) {
+        std::string error;
+        const Value value = Parse(RawFile{{object}}.build(), error);
+        EXPECT_EQ(value.string(), expected) << error;
+        EXPECT_TRUE(value.equalsString(expected));
+    }
+}
+
+TEST(Binary, EqualLeavesAreWrittenOnce) {
+    const Data icon = dataOf(std::string(100'000, 'i')), alike = dataOf(std::string(100'000, 'i'));
+    std::size_t once = 0, many = 0;
+    reread(Array(2, icon), &once);
+    Array icons;
+    for (int i = 0; i < 4000; ++i)
+        icons.push_back(i % 2 == 0 ? icon : alike);
+    EXPECT_EQ(reread(icons, &many), Value(icons));
+    EXPECT_LT(many, once + 4000 * 2 + 32);
+
+    std::string text(40'000, 't');
+    reread(Array{text, text, Dictionary{{text, text}}}, &many);
+    EXPECT_LT(many, 40'200u);
+
+    Array several; // differing where a hash of samples does not look
+    for (char c = 'a'; c < 'z'; ++c)
+        several.push_back(dataOf(std::string(100, '.') + c + std::string(100'000, '.')));
+    for (std::size_t i = 0; i < 25; ++i)
+        several.push_back(several[i]);
+    EXPECT_EQ(reread(several, &many), Value(several));
+    EXPECT_LT(many, 2'510'000u);
+}
+
+TEST(Binary, DataIsNeverCopied) {
+    const Data icon = dataOf(std::string(5000, 'i'));
+    std::string error;
+    const Encoded encoded = WriteBinary(Dictionary{{"icon", icon}}, error);
+    const auto isIcon = [&](std::span<const std::byte> piece) { return piece.data() == icon.data(); };
+    EXPECT_EQ(std::ranges::count_if(encoded.pieces, isIcon), 1);
+
+    Data file = encoded.joined();
+    const std::byte* start = file.data();
+    Value value = Parse(file, error);
+    const std::size_t size = file.size();
+    file = {};
+    const Data inside = value["icon"].data();
+    value = {};
+    EXPECT_GT(inside.data(), start);
+    EXPECT_LT(inside.data(), start + size);
+    EXPECT_EQ(inside, icon); // the bytes live as long as what points into them
+}
+
+TEST(Binary, ParsedPartsAreWrittenAsPartsOfOthers) {
+    const Value parsed = reread(Dictionary{{"é", Array{"é", dataOf(std::string(600, 'd')), Dictionary{}}}});
+    const Value outer = Dictionary{{"inner", parsed["é"]}, {"again", parsed}};
+    EXPECT_EQ(reread(outer), outer);
+}
+
+TEST(Binary, RefusesToWriteWhatCannotBeRead) {
+    const auto errorOf = [](const Value& value, const Limits& limits = {}) {
+        std::string error;
+        EXPECT_TRUE(WriteBinary(value, error, limits).pieces.empty());
+        return error;
+    };
+    EXPECT_EQ(errorOf({}), "nil cannot stand in a property list");
+    EXPECT_EQ(errorOf(Array{1, nullptr}), "nil cannot stand in a property list");
+    EXPECT_EQ(errorOf(std::string(1000, 'x'), {.bytes = 1000}), "the property list is too large");
+    EXPECT_EQ(errorOf(Array{1, 1, 1}, {.objects = 3}), "too many objects");
+
+    Value deep = 1;
+    for (unsigned i = 0; i < kDeepestNesting; ++i)
+        deep = Array{deep};
+    EXPECT_EQ(reread(deep), deep);
+    EXPECT_EQ(errorOf(Array{deep}), "nested too deeply");
+    Value bomb = 1;
+    for (int i = 0; i < 60; ++i)
+        bomb = Array{bomb, bomb};
+    EXPECT_EQ(errorOf(bomb, {.objects = 10'000}), "too many objects");
+}
+
+} // namespace
+
+} // namespace plist

@@ -1,0 +1,186 @@
+#include "lib/plist/Binary.h"
+#include "tests/plist/RawFile.h"
+
+#include <gtest/gtest.h>
+
+#include <bit>
+
+namespace plist {
+
+namespace {
+
+std::string errorOf(const Data& file, const Limits& limits = {}) {
+    std::string error;
+    const Value value = Parse(file, error, limits);
+    EXPECT_EQ(value.isNil(), !error.empty());
+    return error;
+}
+
+std::vector<std::uint64_t> times(std::size_t count, std::uint64_t reference) {
+    return std::vector<std::uint64_t>(count, reference);
+}
+
+/// Each level refers to the next one `width` times.
+Data bomb(std::size_t levels, std::size_t width) {
+    RawFile file;
+    for (std::size_t i = 1; i <= levels; ++i)
+        file.objects.push_back(RawFile::array(times(width, i)));
+    file.objects.push_back("\x09");
+    return file.build();
+}
+
+/// Everything a reader may ask of a value. Answers the bytes it got.
+std::size_t readAll(const Value& value) {
+    std::size_t read = value.stringOr({}).size() + value["key"].size();
+    const Data data = value.data();
+    for (const std::byte each : data.span())
+        read += each == std::byte{} ? 1 : 2;
+    for (std::size_t i = 0; i < value.size(); ++i)
+        read += value.keyAt(i).size() + readAll(value.at(i));
+    return read;
+}
+
+TEST(HostileBinary, MalformedFilesAreRefused) {
+    const std::string one = "\x09";
+    struct Case {
+        const char* error;
+        std::vector<std::string> objects;
+    };
+    const Case cases[] = {
+        {"a reference points past the last object", {RawFile::array({1})}},
+        {"a container holds itself", {RawFile::array({0})}},
+        {"a container holds itself", {RawFile::array({1}), RawFile::dictionary({2, 0}), "Qk"}},
+        {"a key is not a string", {RawFile::dictionary({1, 1}), one}},
+        {"a string is not ASCII", {"Q\x80"}},
+        {"a string is not ASCII", {"\x5F\x10\x14" + std::string(19, 'x') + "\xFF"}},
+        {"an integer of more than 64 bits", {'\x14' + std::string(8, '\xFF') + bigEndian(1, 8)}},
+        {"an object is malformed", {std::string(1, '\0')}},                    // null
+        {"an object is malformed", {"\x80\x01"}},                              // an identifier of an archive
+        {"an object is malformed", {RawFile::container('\xC0', {1}, 1), one}}, // a set
+        {"an object is malformed", {"\x15" + std::string(32, '\0')}},
+        {"an object is malformed", {"\x32" + std::string(8, '\0')}},
+        {"an object is malformed", {"\x4F\x22" + std::string(4, '\0')}}, // a count that is no integer
+        {"an object is longer than the file", {"\x13\x01\x02"}},
+        {"an object is longer than the file", {"\x4F\x13" + bigEndian(std::uint64_t{1} << 63, 8)}},
+        {"an object is longer than the file", {"\x5F\x13" + bigEndian(UINT64_MAX - 1, 8)}},
+        {"an object is longer than the file", {"\x6F\x13" + bigEndian(std::uint64_t{1} << 63, 8)}},
+        {"an object is longer than the file", {"\xAF\x13" + bigEndian(std::uint64_t{1} << 62, 8)}},
+        {"an object is longer than the file", {"\xDF\x13" + bigEndian(std::uint64_t{1} << 61, 8)}},
+        {"an object is longer than the file", {"\xA2" + bigEndian(1, 4) + "\x09"}},
+    };
+    for (const Case& each : cases)
+        EXPECT_EQ(errorOf(RawFile{each.objects}.build()), each.error);
+}
+
+TEST(HostileBinary, WrongTrailersAreRefused) {
+    const Data file = RawFile{{"\x09"}}.build();
+    const std::string whole(reinterpret_cast<const char*>(file.data()), file.size());
+    const auto with = [&](std::size_t fromEnd, std::uint64_t number, std::size_t size) {
+        std::string changed = whole;
+        return dataOf(changed.replace(changed.size() - fromEnd, size, bigEndian(number, size)));
+    };
+    EXPECT_EQ(errorOf(dataOf("text")), "not a property list");
+    EXPECT_EQ(errorOf(dataOf("bplist00")), "the file is too short");
+    EXPECT_EQ(errorOf(dataOf("bplist01" + whole.substr(8))), "not a binary property list");
+    EXPECT_EQ(errorOf(file, {.bytes = file.size() - 1}), "the file is too large");
+    for (const std::uint64_t width : {0u, 9u, 255u}) {
+        EXPECT_EQ(errorOf(with(26, width, 1)), "the trailer is malformed");
+        EXPECT_EQ(errorOf(with(25, width, 1)), "the trailer is malformed");
+    }
+    for (const std::uint64_t count : {std::uint64_t{2}, std::uint64_t{1} << 63, UINT64_MAX})
+        EXPECT_EQ(errorOf(with(24, count, 8)), "the table of offsets is longer than the file");
+    for (const std::uint64_t top : {std::uint64_t{1}, UINT64_MAX})
+        EXPECT_EQ(errorOf(with(16, top, 8)), "a reference points past the last object");
+    for (const std::uint64_t table : {std::uint64_t{7}, std::uint64_t{18}, UINT64_MAX})
+        EXPECT_EQ(errorOf(with(8, table, 8)), "the table of offsets lies outside the file");
+    for (const std::uint64_t offset : {std::uint64_t{0}, std::uint64_t{7}, std::uint64_t{9}, UINT64_MAX})
+        EXPECT_EQ(errorOf(with(40, offset, 8)), "an object lies outside the file");
+}
+
+TEST(HostileBinary, NestingIsBounded) {
+    EXPECT_EQ(errorOf(bomb(512, 1)), "");
+    EXPECT_EQ(errorOf(bomb(513, 1)), "nested too deeply");
+    EXPECT_EQ(errorOf(bomb(100'000, 1)), "nested too deeply");
+    EXPECT_EQ(errorOf(bomb(3, 1), {.nesting = 2}), "nested too deeply");
+    EXPECT_EQ(errorOf(bomb(600, 1), {.nesting = 1000}), "nested too deeply");
+
+    // Seen first near the top, then again where it no longer fits.
+    RawFile shared{
+        {RawFile::array({2, 1}), RawFile::array({2}), RawFile::array({3}), RawFile::array({4}), "\x09"}};
+    EXPECT_EQ(errorOf(shared.build(), {.nesting = 4}), "");
+    EXPECT_EQ(errorOf(shared.build(), {.nesting = 3}), "nested too deeply");
+}
+
+TEST(HostileBinary, SharedReferencesAreCountedEachTime) {
+    EXPECT_EQ(errorOf(bomb(3, 10)), ""); // 1 + 10 + 100 + 1000 objects
+    EXPECT_EQ(errorOf(bomb(3, 10), {.objects = 1111}), "");
+    EXPECT_EQ(errorOf(bomb(3, 10), {.objects = 1110}), "too many objects");
+    EXPECT_EQ(errorOf(bomb(8, 10)), "too many objects");
+    EXPECT_EQ(errorOf(bomb(400, 100)), "too many objects");
+    EXPECT_EQ(errorOf(RawFile{std::vector<std::string>(20, "\x09")}.build(), {.objects = 19}),
+              "too many objects");
+}
+
+TEST(HostileBinary, MegabytesReferredToOftenAreNotMultiplied) {
+    const auto file = [](char kind, const std::string& payload, std::size_t count) {
+        return RawFile{{RawFile::array(times(4000, 1)), kind + ('\x12' + bigEndian(count, 4)) + payload}}
+            .build();
+    };
+    const std::string megabyte(1 << 20, 'x');
+    EXPECT_EQ(errorOf(file('\x5F', megabyte, megabyte.size())), "too many objects");
+    EXPECT_EQ(errorOf(file('\x6F', megabyte, megabyte.size() / 2)), "too many objects");
+
+    std::string error;
+    const Value data = Parse(file('\x4F', megabyte, megabyte.size()), error);
+    ASSERT_EQ(data.size(), 4000u) << error;
+    EXPECT_LT(WriteBinary(data, error).size, megabyte.size() + 10'000);
+}
+
+TEST(HostileBinary, ObjectsDoNotOverlap) {
+    // A thousand objects of a thousand references each, all in the same place.
+    std::string objects = "bplist00" + RawFile::array({}), table = bigEndian(8, 8);
+    const std::string many = RawFile::array(times(1000, 1001));
+    for (int i = 0; i < 1000; ++i)
+        table += bigEndian(objects.size(), 8);
+    table += bigEndian(objects.size() + many.size(), 8);
+    std::vector<std::uint64_t> all;
+    for (std::uint64_t i = 1; i <= 1000; ++i)
+        all.push_back(i);
+    table.replace(0, 8, bigEndian(objects.size() + many.size() + 1, 8));
+    EXPECT_EQ(errorOf(RawFile::finish(objects + many + '\x09' + RawFile::array(all), table)),
+              "objects overlap");
+}
+
+TEST(HostileBinary, EveryCutAndEveryChangeOfAByteIsSafe) {
+    std::string error;
+    // No number in it is a change of one byte away from NaN, which equals nothing.
+    const Value original = Dictionary{{"name", "up"},
+                                      {"é", Array{1, INT64_MIN / 2, 2.0, true, Date{1e9}, UINT64_MAX}},
+                                      {"icon", dataOf(std::string(3, 'i'))},
+                                      {"nested", Dictionary{{"name", Array{"😀", Array{}, "up"}}}}};
+    const Data file = WriteBinary(original, error).joined();
+    const std::string whole(reinterpret_cast<const char*>(file.data()), file.size());
+    for (std::size_t size = 0; size < whole.size(); ++size)
+        EXPECT_NE(errorOf(dataOf(whole.substr(0, size))), "");
+
+    std::size_t read = 0;
+    for (std::size_t at = 0; at < whole.size(); ++at) {
+        for (unsigned change = 1; change < 256; ++change) {
+            std::string changed = whole;
+            changed[at] = static_cast<char>(static_cast<unsigned char>(changed[at]) ^ change);
+            error.clear();
+            const Value value = Parse(dataOf(changed), error);
+            EXPECT_EQ(value.isNil(), !error.empty());
+            if (value.isNil()) continue;
+            read += readAll(value) + value.description().size();
+            if (!std::has_single_bit(change)) continue;
+            const Value again = Parse(WriteBinary(value, error).joined(), error);
+            ASSERT_EQ(again, value) << "byte " << at << " changed by " << change << ": " << error;
+        }
+    }
+    EXPECT_GT(read, 0u);
+}
+
+} // namespace
+
+} // namespace plist

@@ -1,0 +1,52 @@
+#pragma once
+
+#include "lib/raster/pixel.h"
+#include "lib/raster/rowops.h"
+
+#include <immintrin.h>
+
+// The functions carry the instruction set themselves: compiled with it as a whole, a file would also hand
+// inline functions that use it to the rest of the program.
+#define KX_AVX2 [[gnu::target("avx2")]]
+
+namespace raster::avx2 {
+
+using Vector = __m256i; // eight pixels
+constexpr std::int64_t lanes = 8;
+constexpr std::int64_t vectorBytes = 32;
+
+KX_AVX2 inline Vector firstLanes(std::int64_t count) {
+    return _mm256_cmpgt_epi32(_mm256_set1_epi32(static_cast<int>(count)),
+                              _mm256_setr_epi32(0, 1, 2, 3, 4, 5, 6, 7));
+}
+
+/// Eight pixels, or the first `left` if there are fewer: no other is touched, and the rest of the vector is
+/// 0.
+KX_AVX2 inline Vector loadPixels(const std::uint8_t* from, std::int64_t left) {
+    if (left >= lanes) return _mm256_loadu_si256(reinterpret_cast<const Vector*>(from));
+    return _mm256_maskload_epi32(reinterpret_cast<const int*>(from), firstLanes(left));
+}
+
+KX_AVX2 inline void storePixels(std::uint8_t* to, Vector pixels, std::int64_t left) {
+    if (left >= lanes)
+        _mm256_storeu_si256(reinterpret_cast<Vector*>(to), pixels);
+    else
+        _mm256_maskstore_epi32(reinterpret_cast<int*>(to), firstLanes(left), pixels);
+}
+
+/// The channels as words: of pixels 0 and 1, and of pixels 2 and 3, of each half.
+KX_AVX2 inline Vector lowWords(Vector pixels) {
+    return _mm256_unpacklo_epi8(pixels, _mm256_setzero_si256());
+}
+KX_AVX2 inline Vector highWords(Vector pixels) {
+    return _mm256_unpackhi_epi8(pixels, _mm256_setzero_si256());
+}
+
+void permute(const RasterBlock& block, const std::uint8_t* from, std::ptrdiff_t fromBytesPerRow,
+             const RasterChannelMap& map);
+void premultiply(std::uint8_t* pixels, std::size_t count, int alphaByte);
+void unpremultiply(std::uint8_t* pixels, std::size_t count, int alphaByte);
+void multiply(std::uint8_t* to, RasterLayout toLayout, const std::uint8_t* from, RasterLayout fromLayout,
+              std::size_t count);
+
+} // namespace raster::avx2

@@ -1,0 +1,142 @@
+#include "lib/raster/rowops.h"
+#include "tests/support/ScratchHome.h"
+
+#include <functional>
+#include <gtest/gtest.h>
+#include <optional>
+#include <random>
+#include <vector>
+
+using namespace raster;
+using Bytes = std::vector<std::uint8_t>;
+
+namespace {
+
+TEST(RowOps, ColourArithmeticIsExact) {
+    for (unsigned round = 0; round < 2 * 256; ++round) {
+        const unsigned a = round / 2, alphaByte = round % 2 * 3;
+        Bytes row(256 * 4);
+        for (unsigned i = 0; i < row.size(); ++i)
+            row[i] = static_cast<std::uint8_t>(i % 4 == alphaByte ? a : i / 4);
+        Bytes back = row, straight(row.size(), static_cast<std::uint8_t>(a * 7)), clear = straight;
+        Raster_Multiply({straight.data(), 0, 256, 1}, {false, true}, row.data(), 0, {alphaByte == 0, false});
+        Raster_Multiply({clear.data(), 0, 256, 1}, {true, true}, row.data(), 0, {alphaByte == 0, true});
+        Raster_Premultiply({row.data(), 0, 256, 1}, static_cast<int>(alphaByte));
+        Raster_Unpremultiply({back.data(), 0, 256, 1}, static_cast<int>(alphaByte));
+        for (unsigned c = 0; c < 256; ++c) {
+            const unsigned m = (c * a + 127) / 255, t = a * 7 & 255;
+            ASSERT_EQ(row[c * 4 + 1], m);
+            ASSERT_EQ(back[c * 4 + 2], a == 0 ? 0 : std::min(255U, (c * 255 + a / 2) / a));
+            ASSERT_EQ(back[c * 4 + alphaByte], a);
+            ASSERT_EQ(straight[c * 4 + 2], t - (t * (a - m) + 127) / 255);
+            ASSERT_EQ(clear[c * 4 + 2], t - (t * (a - std::min(a, c)) + 127) / 255);
+            ASSERT_TRUE(straight[c * 4 + 3] == t && clear[c * 4] == t) << "alpha stays";
+        }
+    }
+}
+
+TEST(RowOps, EverySumIsAveragedExactly) {
+    constexpr std::size_t sums = 32 * 254 + 4;
+    std::vector<Bytes> bytes(BoxRun::maximum, Bytes(sums));
+    const std::uint8_t* rows[BoxRun::maximum];
+    for (unsigned row = 0; row < bytes.size(); rows[row] = bytes[row].data(), ++row)
+        for (unsigned sum = row * 254; sum < sums; ++sum)
+            bytes[row][sum] = static_cast<std::uint8_t>(std::min(sum - row * 254 + 1, 255U));
+    BoxRun run{0, BoxRun::maximum, {}};
+    std::fill_n(run.weights, run.count, std::uint8_t{255});
+    for (std::uint64_t step = 0x10001; step <= 0xFFFFFFFF; step += step / 41 | 1)
+        for (const RowOps* ops : availableRowOps()) {
+            Bytes averages(sums);
+            ops->averageRows(averages.data(), rows, run, static_cast<std::uint32_t>(step), sums / 4);
+            for (std::size_t sum = 0; sum <= 32 * 254 && sum << 16 <= step * 255; ++sum)
+                ASSERT_EQ(averages[sum], (sum << 16) / step) << ops->name << ", step " << step;
+        }
+}
+
+TEST(RowOps, BlockCopyTakesPixelsOfOneToFourBytes) {
+    const ScratchHome home;
+    const Bytes source{1, 2, 3, 4, 5, 6, 7, 8, 9};
+    Bytes target(9);
+    EXPECT_TRUE(Raster_CopyBlock({target.data(), 3}, {source.data(), 3}, 1, {1, 0, 3, 2}, 0, 1));
+    EXPECT_EQ(target, (Bytes{0, 0, 0, 2, 3, 0, 5, 6, 0}));
+    EXPECT_FALSE(Raster_CopyBlock({target.data(), 9}, {source.data(), 9}, 5, {0, 0, 1, 1}, 0, 0));
+    EXPECT_NE(ScratchHome::log().find(": Raster: Unsupported frame buffer depth\n"), std::string::npos);
+}
+
+/// Runs `job` with every table on the same random bytes, at odd addresses, and compares what it leaves.
+void expectSameOnAllTables(unsigned seed,
+                           const std::function<void(const RowOps&, std::uint8_t*, std::mt19937&)>& job) {
+    std::optional<Bytes> reference;
+    for (const RowOps* ops : availableRowOps()) {
+        std::mt19937 random(seed);
+        Bytes bytes(2048);
+        for (auto& byte : bytes)
+            byte = static_cast<std::uint8_t>(random() % 4 == 0 ? (random() % 2) * 255 : random());
+        job(*ops, bytes.data() + 1, random);
+        if (!reference) reference = bytes;
+        ASSERT_EQ(bytes, *reference) << ops->name << ", seed " << seed;
+    }
+}
+
+TEST(RowOps, EveryInstructionSetGivesTheSameBytes) {
+    constexpr std::ptrdiff_t from = 1025;
+    for (unsigned seed = 0; seed < 71 * 10; ++seed) {
+        const std::size_t count = seed % 71;
+        const bool flag = seed & 1;
+        expectSameOnAllTables(seed, [&](const RowOps& ops, std::uint8_t* to, std::mt19937& random) {
+            const auto weight = static_cast<std::uint8_t>(random());
+            const std::uint8_t* const source = to + from + random() % 7;
+            switch (seed / 71) {
+            case 0: {
+                const std::size_t rows = 1 + seed % 3;
+                const std::size_t width = count / rows;
+                const auto stride = static_cast<std::ptrdiff_t>(width * 4 + 3);
+                return ops.permute({to, stride, width, rows}, source + stride * 2, flag ? stride : -stride,
+                                   flag ? rasterBGRAToARGB : rasterRGBAToARGB);
+            }
+            case 1:
+                return ops.permute({to, 0, count, 1}, to, 0, rasterARGBToRGBA);
+            case 2:
+                return ops.premultiply(to, count, flag ? 0 : 3);
+            case 3:
+                return ops.unpremultiply(to, count, flag ? 0 : 3);
+            case 4:
+                return ops.multiply(to, {flag, true}, source, {random() % 2 == 0, random() % 2 == 0}, count);
+            case 5:
+                return ops.blend(to, source, source + 300, seed % 4 ? weight : (flag ? 0 : 255), count);
+            case 6: {
+                const auto step = static_cast<std::uint32_t>(random() % 0x10000);
+                const auto start = static_cast<std::int64_t>(random() % 0x80000) - 0x8000;
+                return ops.sampleLinear(to, source, {start, step, static_cast<int>(1 + random() % 80)},
+                                        count);
+            }
+            case 7: {
+                const auto step = static_cast<std::uint32_t>(random() % (flag ? 0x20000 : 0x400000));
+                const auto start = static_cast<std::int64_t>(random() % 0x80000);
+                return ops.sampleNearest(to, source, {start, step, static_cast<int>(1 + random() % 80)},
+                                         count);
+            }
+            case 8: {
+                const bool whole = seed % 3 == 0;
+                const auto step = static_cast<std::uint32_t>(
+                    whole ? 0x20000 << random() % 3 : 0x10001 + random() % (flag ? 0x40000 : 0x400000));
+                const auto start =
+                    static_cast<std::int64_t>(random() % 8 << 16 | (whole ? 0 : random() & 0xFFFF));
+                return ops.sampleBox(to, source, {start, step, static_cast<int>(1 + random() % 80)}, count);
+            }
+            default: {
+                const auto step = static_cast<std::uint32_t>(
+                    seed % 3 == 0 ? 0x20000 << random() % 6
+                                  : 0x10001 + random() % (flag ? 0x40000 : 0x400000));
+                const BoxRun run = boxRun(static_cast<std::int64_t>(random() % 0x10000), step);
+                const std::uint8_t* rows[BoxRun::maximum];
+                for (auto& row : rows)
+                    row = source + random() % 700;
+                return ops.averageRows(to, rows, run, step, count);
+            }
+            }
+        });
+    }
+}
+
+} // namespace

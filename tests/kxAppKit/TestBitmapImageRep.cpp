@@ -1,0 +1,295 @@
+#include "lib/kxAppKit/KXBitmapImageRep.h"
+#include "tests/support/ScratchHome.h"
+
+#include <QPainter>
+#include <algorithm>
+#include <gtest/gtest.h>
+#include <limits>
+#include <vector>
+
+extern "C" const char* __asan_default_options() {
+    return "allocator_may_return_null=1";
+}
+
+namespace {
+
+using Bytes = std::vector<std::uint8_t>;
+using Bitmap = KXBitmapImageRep;
+using Interpolation = KXImageInterpolation;
+
+Bitmap::Pointer bitmap(int wide, int high, KXBitmapFormat format = 0, const Bytes& pixel = {}) {
+    auto made = Bitmap::imageRepWith32bitBuffer(nullptr, wide, high, format, 0);
+    for (int i = 0; !pixel.empty() && i < wide * high; ++i)
+        std::copy(pixel.begin(), pixel.end(), made->bitmapData() + i * 4);
+    return made;
+}
+
+Bytes pixelAt(const Bitmap& from, int x, int y) {
+    const std::uint8_t* const p = from.bitmapData() + y * from.bytesPerRow() + x * 4;
+    return {p, p + 4};
+}
+
+/// Exactly one entry, with this text in it.
+void expectLogged(const std::string& text) {
+    const std::string log = ScratchHome::log();
+    EXPECT_EQ(std::count(log.begin(), log.end(), '\n'), 1) << log;
+    EXPECT_NE(log.find(text), std::string::npos) << log << " lacks " << text;
+}
+
+TEST(Bitmap, CreationChecksItsParameters) {
+    constexpr auto method = "+[NSBitmapImageRep(KXAppKitAdditions) "
+                            "imageRepWith32bitBuffer:pixelsWide:pixelsHigh:bitmapFormat:bytesPerRow:]: ";
+    Bytes memory(64, 9);
+    const struct {
+        std::uint8_t* buffer;
+        int wide, high;
+        KXBitmapFormat format;
+        int bytesPerRow;
+        const char* complaint;
+    } cases[] = {
+        {memory.data(), 4, 4, 0, 0, "invalid bitmap creation parameters: buffer=0x"},
+        {memory.data(), 4, 4, 0, 15, ", width=4, height=4, format=0, bytesPerRow=15\n"},
+        {nullptr, 4, 4, 0, 15, "invalid bitmap creation parameters: buffer=(nil)"},
+        {nullptr, 0, 4, 0, 0, "invalid"},
+        {nullptr, 4, -1, 0, 0, "invalid"},
+        {nullptr, 4, 4, 4, 0, "format=4"},
+        {memory.data(), 0x40000001, 1, 0, 4, "invalid"},
+        {memory.data(), 1, 1, 0, -4, "invalid"},
+        {nullptr, 0x40000001, 1, 0, 0,
+         "could not create bitmap with parameters: buffer=(nil), width=1073741825, "
+         "height=1, format=0, bytesPerRow=0\n"},
+        {nullptr, 65536, 65537, 0, 0, "could not create"},
+        {memory.data(), 1, std::numeric_limits<int>::max(), 0, 64, "could not create"},
+    };
+    for (const auto& c : cases) {
+        const ScratchHome home;
+        EXPECT_FALSE(Bitmap::imageRepWith32bitBuffer(c.buffer, c.wide, c.high, c.format, c.bytesPerRow));
+        expectLogged(method);
+        expectLogged(c.complaint);
+    }
+    const auto own = bitmap(3, 2);
+    EXPECT_EQ(pixelAt(*own, 2, 1), Bytes(4)) << "cleared";
+    const auto over = Bitmap::imageRepWith32bitBuffer(memory.data(), 3, 4, 3, 16);
+    EXPECT_EQ(over->bitmapData(), memory.data());
+    EXPECT_EQ(pixelAt(*over, 2, 3), Bytes(4, 9)) << "the caller's memory stays";
+}
+
+TEST(Bitmap, IconBuffersAreFlippedAndReordered) {
+    const Bytes rows{0x10, 0x20, 0x30, 0xFF, 1, 2, 3, 4, 5, 6, 7, 8, 9, 10, 11, 12};
+    const auto icon = Bitmap::imageRepFromFlippedBGRABuffer(rows.data(), 2, 2, 99);
+    ASSERT_TRUE(icon);
+    EXPECT_EQ(icon->bitmapFormat(), 3U);
+    EXPECT_EQ(pixelAt(*icon, 0, 1), (Bytes{0xFF, 0x30, 0x20, 0x10}));
+    EXPECT_EQ(pixelAt(*icon, 0, 0), (Bytes{8, 7, 6, 5}))
+        << "rows follow one another, whatever their length is said to be";
+    const ScratchHome home;
+    EXPECT_FALSE(Bitmap::imageRepFromFlippedBGRABuffer(rows.data(), 0x40000001, 1, 4));
+    expectLogged("+[NSBitmapImageRep(KXAppKitAdditions) "
+                 "imageRepFromFlippedBGRABuffer:pixelsWide:pixelsHigh:bytesPerRow:]"
+                 ": invalid BGRA bitmap parameters: buffer=0x");
+    EXPECT_FALSE(Bitmap::imageRepFromFlippedBGRABuffer(nullptr, 1, 1, 4));
+    EXPECT_FALSE(Bitmap::imageRepFromFlippedBGRABuffer(rows.data(), 2, 0, 8));
+    EXPECT_FALSE(Bitmap::imageRepFromFlippedBGRABuffer(rows.data(), 65536, 65537, 65536 * 4));
+}
+
+TEST(Bitmap, ConvertsBetweenItsLayouts) {
+    const struct {
+        KXBitmapFormat from, to;
+        Bytes before, after;
+    } cases[] = {
+        {3, 0, {128, 255, 0, 0}, {128, 0, 0, 128}}, {0, 3, {128, 0, 0, 128}, {128, 255, 0, 0}},
+        {2, 1, {255, 100, 0, 51}, {51, 51, 20, 0}}, {1, 0, {4, 1, 2, 3}, {1, 2, 3, 4}},
+        {2, 2, {9, 9, 9, 1}, {9, 9, 9, 1}},         {0, 2, {9, 9, 9, 0}, {0, 0, 0, 0}},
+    };
+    for (const auto& [from, to, before, after] : cases) {
+        const auto made = bitmap(3, 1, from, before);
+        EXPECT_TRUE(made->convertBitmapDataFromFormat(from, to));
+        EXPECT_EQ(pixelAt(*made, 2, 0), after) << from << " to " << to;
+        EXPECT_EQ(made->bitmapFormat(), from) << "what is declared stays";
+    }
+    const ScratchHome home;
+    EXPECT_FALSE(bitmap(1, 1)->convertBitmapDataFromFormat(4, 4))
+        << "checks come before the test for equality";
+    expectLogged("-[NSBitmapImageRep(KXAppKitAdditions) convertBitmapDataFromFormat:toFormat:]: invalid "
+                 "bitmap conversion "
+                 "parameters: srcFormat=4, dstFormat=4, bitmap: ");
+    EXPECT_FALSE(Bitmap::imageRepWithPixels(2, 2, 24)->convertBitmapDataFromFormat(0, 1));
+}
+
+TEST(Bitmap, CopiesBlocksFromTheBottomLeft) {
+    const Bytes red{255, 0, 0, 255};
+    const auto source = bitmap(4, 4, 0, red);
+    const struct {
+        KXPoint offset;
+        int left, top, right, bottom;
+    } cases[] = {{{0, 0}, 0, 4, 4, 8}, {{6, 7}, 6, 0, 8, 1},      {{-3, -3}, 0, 7, 1, 8},
+                 {{8, 0}, 0, 0, 0, 0}, {{0, -1e30f}, 0, 0, 0, 0}, {{1e38f, 1e38f}, 0, 0, 0, 0}};
+    for (const auto& c : cases) {
+        const auto target = bitmap(8, 8);
+        EXPECT_TRUE(source->copyBitmapDataIntoRep(*target, c.offset));
+        for (int y = 0; y < 8; ++y)
+            for (int x = 0; x < 8; ++x)
+                ASSERT_EQ(pixelAt(*target, x, y) == red,
+                          x >= c.left && x < c.right && y >= c.top && y < c.bottom)
+                    << c.offset.x << " at " << x << ", " << y;
+    }
+    const ScratchHome home;
+    EXPECT_FALSE(source->copyBitmapDataIntoRep(*bitmap(8, 8), {0.5f, 0}));
+    expectLogged("-[NSBitmapImageRep(KXAppKitAdditions) copyBitmapDataIntoRep:offset:]: invalid bitmap copy "
+                 "parameters: "
+                 "offset={0.5, 0}, source=");
+    EXPECT_FALSE(source->copyBitmapDataIntoRep(*source, {}));
+    EXPECT_FALSE(source->copyBitmapDataIntoRep(*bitmap(8, 8), {std::numeric_limits<float>::infinity(), 0}));
+    EXPECT_FALSE(source->copyBitmapDataIntoRep(*Bitmap::imageRepWithPixels(8, 8, 24), {}));
+}
+
+TEST(Bitmap, MultipliesOnlyWhatItCovers) {
+    const auto black = bitmap(2, 2, 3, {255, 0, 0, 0});
+    const auto target = bitmap(4, 4, 0, {200, 100, 50, 250});
+    EXPECT_TRUE(black->multiplyPixelDataIntoBitmapRep(*target, {3, 3}));
+    EXPECT_EQ(pixelAt(*target, 3, 0), (Bytes{0, 0, 0, 250}));
+    EXPECT_EQ(pixelAt(*target, 2, 0), (Bytes{200, 100, 50, 250}));
+    EXPECT_EQ(pixelAt(*target, 3, 1), (Bytes{200, 100, 50, 250}));
+    const ScratchHome home;
+    target->setColorSpaceName("NSDeviceRGBColorSpace");
+    EXPECT_FALSE(black->multiplyPixelDataIntoBitmapRep(*target, {}));
+    expectLogged(
+        "-[NSBitmapImageRep(KXAppKitAdditions) multiplyPixelDataIntoBitmapRep:offset:]: invalid parameters: "
+        "offset={0, 0}, source=");
+}
+
+TEST(Bitmap, EnlargesOnlyOntoTheWholeOfItsLike) {
+    const auto source = bitmap(2, 2, 1, {255, 255, 255, 255});
+    const auto target = bitmap(4, 4, 1);
+    EXPECT_TRUE(source->drawWithBilinearScalingIntoBitmapRep(*target, {0, 0, 4, 4}));
+    EXPECT_EQ(pixelAt(*target, 3, 3), Bytes(4, 253));
+    const struct {
+        Bitmap::Pointer source, target;
+        KXRect rect;
+    } refused[] = {{source, target, {0, 0, 3, 4}},
+                   {source, bitmap(4, 4, 0), {0, 0, 4, 4}},
+                   {bitmap(2, 2, 3), bitmap(4, 4, 3), {0, 0, 4, 4}},
+                   {source, Bitmap::imageRepWithPixels(4, 4, 24), {0, 0, 4, 4}}};
+    for (const auto& c : refused) {
+        const ScratchHome home;
+        EXPECT_FALSE(c.source->drawWithBilinearScalingIntoBitmapRep(*c.target, c.rect));
+        expectLogged("-[NSBitmapImageRep(KXAppKitAdditions) "
+                     "drawWithBilinearScalingIntoBitmapRep:targetRect:]: invalid "
+                     "bitmap scale parameters: rect={{0, 0}, ");
+    }
+    const ScratchHome home;
+    EXPECT_FALSE(bitmap(1, 1)->drawWithBilinearScalingIntoBitmapRep(*bitmap(32768, 1), {0, 0, 32768, 1}));
+    expectLogged(": error scaling bitmap: rect={{0, 0}, {32768, 1}}, source=");
+}
+
+/// Anything that is no bitmap: fills its rectangle.
+struct Fill : KXImageRep {
+    QColor color;
+    Fill(KXSize size, QColor c)
+        : KXImageRep(size)
+        , color(c) {}
+    void drawInRect(QPainter& painter, const KXRect& r) const override {
+        painter.fillRect(QRectF(static_cast<qreal>(r.x), static_cast<qreal>(r.y), static_cast<qreal>(r.width),
+                                static_cast<qreal>(r.height)),
+                         color);
+    }
+};
+
+TEST(Bitmap, DrawsIntoEveryLayout) {
+    const Fill halfRed({4, 4}, QColor(255, 0, 0, 128));
+    const auto icon = bitmap(2, 2, 3, {128, 255, 0, 0});
+    const auto premultiplied = bitmap(2, 2, 1, {128, 128, 0, 0});
+    const Bytes red[] = {{128, 0, 0, 128}, {128, 128, 0, 0}, {255, 0, 0, 128}, {128, 255, 0, 0}};
+    const Bytes before{7, 60, 50, 40}; // no premultiplied pixel, whatever the layout
+    for (KXBitmapFormat format = 0; format < 4; ++format)
+        for (const KXImageRep* source :
+             {static_cast<const KXImageRep*>(&halfRed), static_cast<const KXImageRep*>(icon.get()),
+              static_cast<const KXImageRep*>(premultiplied.get())})
+            for (const KXRect& rect : {KXRect{2, 1, 2, 2}, KXRect{1, 0, 3, 5}, KXRect{0, 0, 6, 6},
+                                       KXRect{-1, 4, 3, 9}, KXRect{9, 0, 2, 2}}) {
+                const auto target = bitmap(6, 6, format, before);
+                ASSERT_TRUE(source->drawIntoBitmapRep(*target, rect, Interpolation::high));
+                for (int y = 0; y < 6; ++y)
+                    for (int x = 0; x < 6; ++x) {
+                        const auto cx = static_cast<float>(x);
+                        const auto cy = static_cast<float>(5 - y);
+                        const bool inside =
+                            cx >= rect.x && cx < rect.maxX() && cy >= rect.y && cy < rect.maxY();
+                        const Bytes want = inside ? red[format] : before;
+                        const Bytes got = pixelAt(*target, x, y);
+                        for (std::size_t i = 0; i < 4; ++i)
+                            ASSERT_NEAR(got[i], want[i], inside ? 2 : 0)
+                                << "format " << format << " rect " << rect.x << " at " << x << ", " << y;
+                    }
+            }
+}
+
+TEST(Bitmap, FractionalRectanglesLeaveOtherPixelsAlone) {
+    const Fill white({1, 1}, Qt::white);
+    for (KXBitmapFormat format = 0; format < 4; ++format) {
+        const auto target = bitmap(6, 6, format, {1, 60, 50, 40});
+        EXPECT_TRUE(white.drawIntoBitmapRep(*target, {1.5f, 1, 2, 2}, Interpolation::high));
+        EXPECT_EQ(pixelAt(*target, 0, 4), (Bytes{1, 60, 50, 40}));
+        EXPECT_EQ(pixelAt(*target, 4, 4), (Bytes{1, 60, 50, 40}));
+        EXPECT_EQ(pixelAt(*target, 2, 4), Bytes(4, 255));
+        EXPECT_NE(pixelAt(*target, 1, 4), Bytes(4, 255)) << "half covered";
+    }
+}
+
+TEST(Bitmap, DrawsOnRowsAtOddAddressesAndOverHugeRectangles) {
+    Bytes memory(4 * 25 + 1, 7);
+    const auto odd = Bitmap::imageRepWith32bitBuffer(memory.data() + 1, 4, 4, 0, 25);
+    EXPECT_TRUE(Fill({1, 1}, Qt::white).drawIntoBitmapRep(*odd, {1, 0, 2, 4}, Interpolation::none));
+    EXPECT_EQ(pixelAt(*odd, 1, 3), Bytes(4, 255));
+    EXPECT_EQ(pixelAt(*odd, 0, 3), Bytes(4, 7));
+    EXPECT_EQ(memory[1 + 16], 7) << "between the rows";
+    const auto target = bitmap(4, 4);
+    const auto source = bitmap(2, 2, 0, {9, 9, 9, 255});
+    for (const KXRect& rect : {KXRect{-1e30f, -1e30f, 2e30f, 2e30f}, KXRect{0, 0, 4e9f, 3},
+                               KXRect{0, 0, 4e12f, 1}, KXRect{1, 1, 1e-30f, 2}})
+        EXPECT_TRUE(source->drawIntoBitmapRep(*target, rect, Interpolation::high));
+    const ScratchHome home;
+    EXPECT_FALSE(source->drawIntoBitmapRep(*target, {0, 0, 0, 4}, Interpolation::high));
+    expectLogged("-[NSImageRep(KXAppKitAdditions) drawIntoBitmapRep:targetRect:interpolation:]: Invalid "
+                 "target for drawing "
+                 "into: rect {{0, 0}, {0, 4}}, target ");
+    EXPECT_FALSE(Fill({0, 1}, Qt::white).drawIntoBitmapRep(*target, {0, 0, 4, 4}, Interpolation::high));
+    EXPECT_FALSE(
+        source->drawIntoBitmapRep(*Bitmap::imageRepWithPixels(4, 4, 24), {0, 0, 4, 4}, Interpolation::high));
+}
+
+TEST(Bitmap, GoesThroughTiffAndBack) {
+    const char profile[] = "not really a profile";
+    for (KXBitmapFormat format = 0; format < 4; ++format) {
+        const auto original =
+            bitmap(5, 3, format, format & 1 ? Bytes{128, 100, 50, 25} : Bytes{100, 50, 25, 128});
+        original->bitmapData()[(format & 1) + 4] = 99;
+        original->setColorSyncProfileData(SharedBytes::copyOf(profile, sizeof profile));
+        const auto copy = Bitmap::imageRepWithData(original->TIFFRepresentation());
+        ASSERT_TRUE(copy);
+        EXPECT_EQ(copy->bitmapFormat(), format & 2U);
+        EXPECT_EQ(pixelAt(*copy, 1, 0), (Bytes{99, 50, 25, 128}));
+        EXPECT_EQ(pixelAt(*copy, 4, 2), (Bytes{100, 50, 25, 128}));
+        EXPECT_TRUE(copy->colorProfileMatchesBitmap(*original));
+        const QImage image = original->createCGImageRef();
+        EXPECT_EQ(image.size(), QSize(5, 3));
+        EXPECT_EQ(qAlpha(image.pixel(0, 0)), 128);
+    }
+    const auto opaque = Bitmap::imageRepWithPixels(2, 2, 24);
+    opaque->bitmapData()[11] = 77;
+    const auto copy = Bitmap::imageRepWithData(opaque->TIFFRepresentation());
+    EXPECT_FALSE(copy->hasAlpha());
+    EXPECT_EQ(copy->bitmapData()[11], 77);
+    EXPECT_FALSE(copy->colorProfileMatchesBitmap(*[&] {
+        auto other = bitmap(1, 1);
+        other->setColorSyncProfileData(SharedBytes::copyOf(profile, 3));
+        return other;
+    }()));
+    const ScratchHome home;
+    for (std::size_t size : {std::size_t{0}, std::size_t{7}, std::size_t{100}}) {
+        const SharedBytes whole = opaque->TIFFRepresentation();
+        EXPECT_FALSE(Bitmap::imageRepWithData(whole.slice(0, std::min(size, whole.size() - 1)))) << size;
+    }
+}
+
+} // namespace

@@ -1,0 +1,126 @@
+#include "lib/kxAppKit/KXBezierPath.h"
+#include "lib/kxAppKit/KXColor.h"
+#include "tests/support/GuiApplication.h"
+
+#include <QImage>
+#include <QPainter>
+#include <QWindow>
+#include <gtest/gtest.h>
+
+namespace {
+
+QImage canvas(int width, int height) {
+    QImage image(width, height, QImage::Format_ARGB32_Premultiplied);
+    image.fill(Qt::transparent);
+    return image;
+}
+
+std::vector<QPointF> pointsOf(const KXBezierPath& path) {
+    std::vector<QPointF> points;
+    for (int i = 0; i < path.path().elementCount(); ++i)
+        points.push_back(path.path().elementAt(i));
+    return points;
+}
+
+TEST(BezierPath, ArrowsPointAsTheyAreTold) {
+    using Points = std::vector<QPointF>;
+    const KXRect rect{0, 0, 7, 4};
+    EXPECT_EQ(pointsOf(KXBezierPath::arrowInRect(rect, KXArrowDirectionUp)),
+              (Points{{0, 0}, {4, 4}, {7, 0}, {0, 0}}));
+    EXPECT_EQ(pointsOf(KXBezierPath::arrowInRect(rect, KXArrowDirectionDown)),
+              (Points{{0, 4}, {4, 0}, {7, 4}, {0, 4}}));
+    EXPECT_EQ(pointsOf(KXBezierPath::arrowInRect(rect, KXArrowDirectionLeft)),
+              (Points{{0, 2}, {7, 0}, {7, 4}, {0, 2}}));
+    EXPECT_EQ(pointsOf(KXBezierPath::arrowInRect(rect, KXArrowDirectionRight)),
+              (Points{{0, 0}, {0, 4}, {7, 2}, {0, 0}}));
+    EXPECT_TRUE(KXBezierPath::arrowInRect(rect, 4).isEmpty());
+    EXPECT_TRUE(KXBezierPath::arrowInRect(rect, -1).isEmpty());
+    EXPECT_EQ(pointsOf(KXBezierPath::arrowInRect({0.7f, 0, 3, 1}, 0))[1].x(), 2)
+        << "the apex itself is rounded";
+}
+
+TEST(BezierPath, RoundRectangles) {
+    const KXRect rect{10, 20, 30, 12};
+    const KXBezierPath sharp = KXBezierPath::bezierPathWithRoundRect(rect, 0);
+    EXPECT_EQ(sharp.bounds(), rect);
+    EXPECT_EQ(pointsOf(sharp).front(), QPointF(10, 20));
+    const KXBezierPath round = KXBezierPath::bezierPathWithRoundRect(rect, 3);
+    EXPECT_EQ(round.bounds(), rect);
+    EXPECT_EQ(pointsOf(round)[0], QPointF(10, 23));
+    EXPECT_FALSE(round.path().contains(QPointF(10.5, 20.5)));
+    EXPECT_TRUE(round.path().contains(QPointF(11, 21)));
+    EXPECT_GT(KXBezierPath::bezierPathWithRoundRect(rect, 8).bounds().height, 11)
+        << "crosses itself, and is kept";
+}
+
+TEST(BezierPath, XSymbolIsTheDiagonalsOfItsSquare) {
+    const KXBezierPath path = KXBezierPath::xSymbolInRect({0, 0, 20, 10}, 1);
+    const auto points = pointsOf(path);
+    ASSERT_EQ(points.size(), 4U);
+    EXPECT_FLOAT_EQ(path.lineWidth(), 1.75f);
+    EXPECT_EQ(points[3], QPointF(6, 1));
+    EXPECT_NEAR(points[0].y(), 8.071, 0.001);
+    EXPECT_NEAR(points[1].x(), 13.071, 0.001);
+}
+
+TEST(BezierPath, StrokesInside) {
+    QImage image = canvas(12, 12);
+    QPainter painter(&image);
+    KXBezierPath path = KXBezierPath::bezierPathWithRoundRect({2, 2, 8, 8}, 0);
+    path.strokeInside(painter, Qt::black);
+    for (int y = 0; y < 12; ++y)
+        for (int x = 0; x < 12; ++x) {
+            const bool inside = x >= 2 && x < 10 && y >= 2 && y < 10;
+            const bool deep = x >= 3 && x < 9 && y >= 3 && y < 9;
+            ASSERT_EQ(qAlpha(image.pixel(x, y)), inside && !deep ? 255 : 0) << x << ", " << y;
+        }
+    EXPECT_EQ(path.lineWidth(), 1);
+    image.fill(Qt::transparent);
+    path.strokeInsideWithinRect(painter, Qt::black, {0, 0, 4, 12});
+    EXPECT_EQ(qAlpha(image.pixel(3, 2)), 255);
+    EXPECT_EQ(qAlpha(image.pixel(4, 2)), 0);
+    EXPECT_FALSE(painter.hasClipping());
+}
+
+TEST(BezierPath, GradientsFillTheBandAcrossTheWholeClip) {
+    QImage image = canvas(40, 64);
+    QPainter painter(&image);
+    KXBezierPath::linearGradientFill(painter, {10, 20, 5, 30}, Qt::black, Qt::white);
+    for (int x : {0, 39}) {
+        EXPECT_EQ(qAlpha(image.pixel(x, 19)), 0);
+        EXPECT_EQ(qAlpha(image.pixel(x, 20)), 255);
+        EXPECT_EQ(qAlpha(image.pixel(x, 49)), 255);
+        EXPECT_EQ(qAlpha(image.pixel(x, 50)), 0);
+    }
+    EXPECT_LT(qRed(image.pixel(0, 20)), 12);
+    EXPECT_GT(qRed(image.pixel(0, 49)), 243);
+    image.fill(Qt::transparent);
+    painter.setClipRect(8, 0, 4, 64);
+    KXBezierPath::linearGradientFill(painter, {0, 0, 1, 64}, QColor(), QColor(255, 0, 0));
+    EXPECT_EQ(qAlpha(image.pixel(7, 60)), 0);
+    EXPECT_NEAR(qAlpha(image.pixel(9, 32)), 128, 3);
+    EXPECT_NEAR(qRed(image.pixel(9, 32)), 64, 4)
+        << "half red at half alpha: components fade apart from alpha";
+}
+
+TEST(Color, BordersFadeUnlessTheWindowIsActive) {
+    ensureGuiApplication();
+    QWindow window;
+    for (const QWindow* inactive :
+         {static_cast<const QWindow*>(nullptr), static_cast<const QWindow*>(&window)}) {
+        EXPECT_TRUE(KXColor::shouldDrawSecondaryHighlightForView(inactive));
+        EXPECT_FLOAT_EQ(KXColor::darkBorderForView(inactive).redF(), QColor::fromRgbF(0.529f, 0, 0).redF());
+        EXPECT_FLOAT_EQ(KXColor::semiDarkBorderForView(inactive).redF(),
+                        QColor::fromRgbF(0.933f, 0, 0).redF());
+    }
+    window.show();
+    window.requestActivate();
+    QCoreApplication::processEvents();
+    EXPECT_FALSE(KXColor::shouldDrawSecondaryHighlightForView(&window));
+    EXPECT_FLOAT_EQ(KXColor::darkBorderForView(&window).redF(), QColor::fromRgbF(0.25f, 0, 0).redF());
+    EXPECT_FLOAT_EQ(KXColor::semiDarkBorderForView(&window).redF(), QColor::fromRgbF(0.85f, 0, 0).redF());
+    EXPECT_EQ(KXColor::whiteWithAlpha(0.5f), QColor::fromRgbF(1, 1, 1, 0.5f));
+    EXPECT_EQ(KXColor::blackWithAlpha(2), QColor(0, 0, 0));
+}
+
+} // namespace

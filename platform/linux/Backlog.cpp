@@ -1,0 +1,57 @@
+#include "platform/linux/Backlog.h"
+
+#include <utility>
+
+namespace platform {
+
+void Backlog::Load::add(std::size_t size) {
+    ++messages;
+    bytes += size;
+}
+
+void Backlog::Load::remove(std::size_t size) {
+    --messages;
+    bytes -= size;
+}
+
+bool Backlog::Load::isWithin(const Bounds& bounds) const {
+    return messages < bounds.messages && bytes < bounds.bytes;
+}
+
+/// Whether to call for more. Not before half is free, or every message would wake the reader.
+bool Backlog::Load::takeRoom(const Bounds& bounds) {
+    return refused && isWithin({bounds.messages / 2, bounds.bytes / 2}) && std::exchange(refused, false);
+}
+
+bool Backlog::admits(int sender) {
+    const std::lock_guard lock(m_mutex);
+    const auto found = m_senders.find(sender);
+    if (found == m_senders.end()) return true;
+    found->second.refused = !found->second.isWithin(ofSender);
+    const bool isFull = !m_all.isWithin(ofAll);
+    m_all.refused |= isFull;
+    found->second.refused |= isFull;
+    return !found->second.refused;
+}
+
+void Backlog::add(int sender, std::size_t bytes) {
+    const std::lock_guard lock(m_mutex);
+    m_senders[sender].add(bytes);
+    m_all.add(bytes);
+}
+
+void Backlog::remove(int sender, std::size_t bytes) {
+    bool isRoom;
+    {
+        const std::lock_guard lock(m_mutex);
+        const auto found = m_senders.find(sender);
+        found->second.remove(bytes);
+        m_all.remove(bytes);
+        const bool isRoomForSender = found->second.takeRoom(ofSender); // both are asked, whatever they say
+        isRoom = m_all.takeRoom(ofAll) || isRoomForSender;
+        if (found->second.messages == 0) m_senders.erase(found);
+    }
+    if (isRoom) m_onRoom();
+}
+
+} // namespace platform

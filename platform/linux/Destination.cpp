@@ -1,0 +1,265 @@
+#include "platform/linux/Destination.h"
+
+#include "lib/base/Log.h"
+#include "platform/Clock.h"
+#include "platform/MessagePort.h"
+#include "platform/linux/Descriptor.h"
+#include "platform/linux/PortNames.h"
+#include "platform/linux/PortPacket.h"
+#include "platform/linux/SealedMemory.h"
+
+#include <chrono>
+#include <cstddef>
+#include <cstdint>
+#include <memory>
+#include <mutex>
+#include <optional>
+#include <poll.h>
+
+#include <string>
+#include <utility>
+
+namespace platform {
+
+namespace {
+
+// A queue holds so much; one message alone may be of any size.
+constexpr std::size_t maximalQueuedBytes = maximalPayload;
+constexpr std::size_t maximalQueuedMessages = 65536;
+constexpr std::size_t maximalQueuedDescriptors = 128;
+
+SendStatus StatusFrom(Sending sending) {
+    switch (sending) {
+    case Sending::taken:
+        return SendStatus::success;
+    case Sending::hungUp:
+        return SendStatus::becameInvalid;
+    default:
+        return SendStatus::transportError;
+    }
+}
+
+bool MustWait(Sending sending) {
+    return sending == Sending::busy || sending == Sending::exhausted;
+}
+
+} // namespace
+
+Destination::Destination(const PortNames& names, const Clock& clock, PortTap& tap, Delegate& delegate,
+                         std::string name)
+    : m_names(names)
+    , m_clock(clock)
+    , m_tap(tap)
+    , m_delegate(delegate)
+    , m_name(std::move(name)) {}
+
+bool Destination::connect() {
+    const std::lock_guard lock(m_mutex);
+    drainLocked();
+    return m_socket || openConnection() != Sending::hungUp;
+}
+
+SendStatus Destination::send(BytePieces pieces, bool synchronous, RemotePort::Timeouts timeouts) {
+    auto packet = OutgoingPacket::make(pieces, synchronous, synchronous ? ++m_sequence : 0, m_inlineLimit);
+    if (!packet) return SendStatus::transportError;
+    std::unique_lock lock(m_mutex);
+    if (m_queue.empty()) {
+        Socket socket;
+        const auto sending = transmit(lock, *packet, socket);
+        if (!MustWait(sending)) {
+            if (!synchronous || sending != Sending::taken) return StatusFrom(sending);
+            lock.unlock();
+            return awaitAnswer(socket, packet->sequence(), timeouts.receive);
+        }
+    }
+    giveUpOverdue();
+    if (!hasRoomFor(*packet)) {
+        noteDrop();
+        return synchronous ? SendStatus::sendTimeout : SendStatus::success;
+    }
+    const auto waiting = enqueue(std::move(*packet), m_clock.now() + timeouts.send);
+    return synchronous ? awaitTurn(lock, waiting, timeouts) : SendStatus::success;
+}
+
+void Destination::drain() {
+    const std::lock_guard lock(m_mutex);
+    drainLocked();
+}
+
+bool Destination::takeEnd() {
+    const std::lock_guard lock(m_mutex);
+    return std::exchange(m_ended, false);
+}
+
+bool Destination::isIdle() const {
+    const std::lock_guard lock(m_mutex);
+    return !m_socket && m_queue.empty();
+}
+
+Destination::Socket Destination::socket() const {
+    const std::lock_guard lock(m_mutex);
+    return m_socket;
+}
+
+std::optional<Destination::Pending> Destination::flush() {
+    std::unique_lock lock(m_mutex);
+    giveUpOverdue();
+    while (!m_queue.empty()) {
+        const auto first = m_queue.front();
+        m_transmitting = true;
+        const auto sending = transmit(lock, first->packet, first->takenBy);
+        m_transmitting = false;
+        m_changed.notify_all();
+        if (MustWait(sending)) return Pending{sending == Sending::busy ? m_socket : nullptr, first->deadline};
+        if (sending == Sending::taken) {
+            removeFirst();
+            continue;
+        }
+        // Without a receiver the rest has nowhere to go either.
+        const auto given = sending == Sending::hungUp ? m_queue.size() : 1;
+        for (std::size_t i = 0; i < given; ++i)
+            giveUpFirst(StatusFrom(sending));
+    }
+    return std::nullopt;
+}
+
+/// Taken, if there is one now.
+Sending Destination::openConnection() {
+    Descriptor socket;
+    switch (m_names.connect(m_name, socket)) {
+    case PortNames::Connecting::refused:
+        return Sending::hungUp;
+    case PortNames::Connecting::busy:
+        return Sending::exhausted;
+    case PortNames::Connecting::done:
+        break;
+    }
+    int sendBuffer = 0;
+    socklen_t size = sizeof sendBuffer;
+    getsockopt(socket.get(), SOL_SOCKET, SO_SNDBUF, &sendBuffer, &size);
+    m_inlineLimit = InlineLimit(sendBuffer);
+    m_socket = std::make_shared<const Descriptor>(std::move(socket));
+    m_warned = false;
+    m_delegate.didChangeConnection(m_name);
+    return Sending::taken;
+}
+
+/// Unlocks while the system copies the packet: an asynchronous sender must not wait for that.
+Sending Destination::transmit(std::unique_lock<std::mutex>& lock, const OutgoingPacket& packet,
+                              Socket& takenBy) {
+    for (int attempt = 0; attempt < 2; ++attempt) {
+        if (!m_socket) {
+            const auto opening = openConnection();
+            if (opening != Sending::taken) return opening;
+        }
+        const auto socket = m_socket;
+        lock.unlock();
+        const auto sending = packet.send(socket->get());
+        if (sending == Sending::taken) m_tap.didSend(packet, socket->get());
+        lock.lock();
+        if (sending == Sending::taken) takenBy = socket;
+        if (sending != Sending::hungUp) return sending;
+        if (m_socket == socket) endConnection();
+    }
+    return Sending::hungUp;
+}
+
+void Destination::endConnection() {
+    m_socket.reset();
+    m_ended = true;
+    m_delegate.didChangeConnection(m_name);
+}
+
+void Destination::drainLocked() {
+    std::uint64_t ignored = 0;
+    auto reading = Reading::packet;
+    while (m_socket && reading == Reading::packet)
+        reading = ReadAnswer(m_socket->get(), ignored);
+    if (reading == Reading::end || reading == Reading::bad) endConnection();
+}
+
+bool Destination::hasRoomFor(const OutgoingPacket& packet) const {
+    return m_queue.empty() ||
+           (m_queuedBytes + packet.size() <= maximalQueuedBytes && m_queue.size() < maximalQueuedMessages &&
+            (!packet.hasDescriptor() || m_queuedDescriptors < maximalQueuedDescriptors));
+}
+
+std::shared_ptr<Destination::Waiting> Destination::enqueue(OutgoingPacket packet, Clock::Instant deadline) {
+    packet.own();
+    countQueued(packet, true);
+    m_queue.push_back(std::make_shared<Waiting>(Waiting{std::move(packet), deadline}));
+    if (m_queue.size() == 1) m_delegate.didQueue(shared_from_this());
+    return m_queue.back();
+}
+
+SendStatus Destination::awaitTurn(std::unique_lock<std::mutex>& lock, const std::shared_ptr<Waiting>& waiting,
+                                  RemotePort::Timeouts timeouts) {
+    const auto isDone = [&] { return waiting->takenBy || waiting->fate; };
+    m_changed.wait_for(lock, timeouts.send, isDone);
+    m_changed.wait(lock, [&] { return isDone() || !m_transmitting || m_queue.front() != waiting; });
+    if (waiting->fate) return *waiting->fate;
+    if (const auto socket = waiting->takenBy) {
+        lock.unlock();
+        return awaitAnswer(socket, waiting->packet.sequence(), timeouts.receive);
+    }
+    // Only the main thread adds to the queue, and it was here: the message is the last.
+    countQueued(waiting->packet, false);
+    m_queue.pop_back();
+    noteDrop();
+    return SendStatus::sendTimeout;
+}
+
+SendStatus Destination::awaitAnswer(const Socket& socket, std::uint64_t sequence,
+                                    std::chrono::milliseconds timeout) {
+    using std::chrono::steady_clock;
+    const auto deadline = steady_clock::now() + timeout;
+    for (;;) {
+        std::uint64_t answered = 0;
+        const auto reading = ReadAnswer(socket->get(), answered);
+        if (reading == Reading::packet && answered == sequence) return SendStatus::success;
+        if (reading == Reading::packet) continue; // for one that was not waited for to its end
+        if (reading != Reading::nothing) break;
+        const auto left = std::chrono::ceil<std::chrono::milliseconds>(deadline - steady_clock::now());
+        if (left.count() <= 0) return SendStatus::receiveTimeout;
+        pollfd polled{socket->get(), POLLIN, 0};
+        poll(&polled, 1, static_cast<int>(left.count()));
+    }
+    const std::lock_guard lock(m_mutex);
+    if (m_socket == socket) endConnection();
+    return SendStatus::becameInvalid;
+}
+
+void Destination::giveUpOverdue() {
+    while (!m_queue.empty() && !m_transmitting && m_queue.front()->deadline <= m_clock.now())
+        giveUpFirst(SendStatus::sendTimeout);
+}
+
+void Destination::removeFirst() {
+    countQueued(m_queue.front()->packet, false);
+    m_queue.pop_front();
+    m_changed.notify_all();
+}
+
+void Destination::giveUpFirst(SendStatus fate) {
+    m_queue.front()->fate = fate;
+    removeFirst();
+    noteDrop();
+}
+
+void Destination::countQueued(const OutgoingPacket& packet, bool isAdded) {
+    // Counts are unsigned: minus one wraps to what adds up right.
+    const std::size_t sign = isAdded ? 1 : std::size_t{0} - 1;
+    m_queuedBytes += sign * packet.size();
+    m_queuedDescriptors += packet.hasDescriptor() ? sign : 0;
+    m_tap.counters.queued += sign;
+    m_tap.counters.queuedBytes += sign * packet.size();
+}
+
+/// Says it once for each connection.
+void Destination::noteDrop() {
+    ++m_tap.counters.dropped;
+    if (std::exchange(m_warned, true)) return;
+    Warning("IPC: %s: dropping messages to %s, which does not take them\n", "Destination", m_name.c_str());
+}
+
+} // namespace platform

@@ -1,0 +1,101 @@
+#pragma once
+
+#include "platform/Clock.h"
+#include "platform/MessagePort.h"
+#include "platform/linux/PortNames.h"
+#include "platform/linux/PortPacket.h"
+#include "platform/linux/PortTap.h"
+
+#include <atomic>
+#include <condition_variable>
+#include <deque>
+#include <mutex>
+
+namespace platform {
+
+/// A name that we send to: the one connection that is kept to it, and the messages that the system has not
+/// taken yet. A connection that has ended is opened anew once before messages are given up.
+class Destination : public std::enable_shared_from_this<Destination> {
+public:
+    using Socket = std::shared_ptr<const Descriptor>;
+
+    /// Called from any thread, with the destination locked.
+    class Delegate {
+    public:
+        virtual ~Delegate() = default;
+        /// Messages wait now, and did not before.
+        virtual void didQueue(std::shared_ptr<Destination> destination) = 0;
+        /// There is another connection, or none.
+        virtual void didChangeConnection(const std::string& name) = 0;
+    };
+
+    /// All but the name must outlive it.
+    Destination(const PortNames& names, const Clock& clock, PortTap& tap, Delegate& delegate,
+                std::string name);
+
+    // For the main thread.
+
+    /// Connects if need be; false when nobody listens.
+    bool connect();
+    SendStatus send(BytePieces pieces, bool synchronous, RemotePort::Timeouts timeouts);
+    /// Throws away answers that nobody waits for any more, and learns of the end of the connection.
+    void drain();
+    /// Whether a connection has ended since this was asked last.
+    bool takeEnd();
+    bool isIdle() const; ///< neither a connection nor messages
+
+    // For any thread.
+
+    Socket socket() const;
+
+    struct Pending {
+        Socket socket; ///< to be waited for until it takes more; null: just try again soon
+        Clock::Instant deadline;
+    };
+    /// Sends what the system takes now and gives up what is overdue. What to wait for, if messages are left.
+    std::optional<Pending> flush();
+
+private:
+    struct Waiting {
+        OutgoingPacket packet;
+        Clock::Instant deadline;
+        Socket takenBy{};                 ///< once it is sent
+        std::optional<SendStatus> fate{}; ///< once it is given up
+    };
+    using Queue = std::deque<std::shared_ptr<Waiting>>;
+
+    Sending openConnection();
+    Sending transmit(std::unique_lock<std::mutex>& lock, const OutgoingPacket& packet, Socket& takenBy);
+    void endConnection();
+    void drainLocked();
+    bool hasRoomFor(const OutgoingPacket& packet) const;
+    std::shared_ptr<Waiting> enqueue(OutgoingPacket packet, Clock::Instant deadline);
+    SendStatus awaitTurn(std::unique_lock<std::mutex>& lock, const std::shared_ptr<Waiting>& waiting,
+                         RemotePort::Timeouts timeouts);
+    SendStatus awaitAnswer(const Socket& socket, std::uint64_t sequence, std::chrono::milliseconds timeout);
+    void giveUpOverdue();
+    void countQueued(const OutgoingPacket& packet, bool isAdded);
+    void removeFirst();
+    void giveUpFirst(SendStatus fate);
+    void noteDrop();
+
+    const PortNames& m_names;
+    const Clock& m_clock;
+    PortTap& m_tap;
+    Delegate& m_delegate;
+    const std::string m_name;
+    std::uint64_t m_sequence = 0; ///< main thread
+    std::atomic<std::size_t> m_inlineLimit = maximalInlinePayload;
+
+    mutable std::mutex m_mutex; ///< guards what follows; nothing that takes long is done with it
+    std::condition_variable m_changed;
+    Socket m_socket;
+    Queue m_queue;               ///< while it is empty, the main thread sends; else the flusher
+    bool m_transmitting = false; ///< the first of the queue
+    std::size_t m_queuedBytes = 0;
+    std::size_t m_queuedDescriptors = 0;
+    bool m_ended = false;
+    bool m_warned = false; ///< about this connection's receiver
+};
+
+} // namespace platform

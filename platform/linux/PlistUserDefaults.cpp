@@ -1,0 +1,49 @@
+#include "platform/linux/PlistUserDefaults.h"
+
+#include "lib/base/Log.h"
+#include "lib/plist/Binary.h"
+#include "lib/plist/Value.h"
+
+#include <cstdlib>
+#include <filesystem>
+#include <fstream>
+#include <ios>
+#include <iterator>
+#include <string>
+#include <system_error>
+
+namespace platform {
+
+namespace fs = std::filesystem;
+
+fs::path PlistUserDefaults::globalDomainPath() {
+    const char* home = std::getenv("HOME");
+    return fs::path(home ? home : "/") / "Library/Preferences/.GlobalPreferences.plist";
+}
+
+int PlistUserDefaults::integerForKey(const std::string& key) const {
+    if (const Stamp stamp = currentStamp(); stamp != m_stamp) {
+        m_stamp = stamp;
+        m_values = stamp == Stamp{} ? plist::Value() : read();
+    }
+    return m_values[key].intValue();
+}
+
+PlistUserDefaults::Stamp PlistUserDefaults::currentStamp() const {
+    std::error_code missing;
+    const auto modified = fs::last_write_time(m_path, missing);
+    if (missing) return {};
+    const auto size = fs::file_size(m_path, missing);
+    return missing ? Stamp{} : Stamp{modified, size};
+}
+
+plist::Value PlistUserDefaults::read() const {
+    std::ifstream file(m_path, std::ios::binary);
+    const std::string text{std::istreambuf_iterator<char>(file), {}};
+    std::string error;
+    auto values = plist::Parse(plist::Data::copyOf(text.data(), text.size()), error);
+    if (values.isNil()) Log("cannot read the settings in %s: %s\n", m_path.c_str(), error.c_str());
+    return values;
+}
+
+} // namespace platform

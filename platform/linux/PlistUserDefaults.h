@@ -1,0 +1,40 @@
+#pragma once
+
+#include "lib/plist/Value.h"
+#include "platform/UserDefaults.h"
+
+#include <cstdint>
+#include <filesystem>
+#include <string>
+#include <utility>
+
+namespace platform {
+
+/// Settings from a property-list file, read again when the file has changed. A file that cannot be parsed is
+/// logged once and holds nothing until it changes. Main thread only.
+class PlistUserDefaults final : public UserDefaults {
+public:
+    /// Of the global domain: ~/Library/Preferences/.GlobalPreferences.plist.
+    static std::filesystem::path globalDomainPath();
+
+    explicit PlistUserDefaults(std::filesystem::path path = globalDomainPath())
+        : m_path(std::move(path)) {}
+
+    int integerForKey(const std::string& key) const override;
+
+private:
+    /// Of the file as it was read; all zero while there is none.
+    struct Stamp {
+        std::filesystem::file_time_type modified;
+        std::uintmax_t size = 0;
+        friend bool operator==(const Stamp&, const Stamp&) = default;
+    };
+    Stamp currentStamp() const;
+    plist::Value read() const;
+
+    std::filesystem::path m_path;
+    mutable Stamp m_stamp;
+    mutable plist::Value m_values;
+};
+
+} // namespace platform

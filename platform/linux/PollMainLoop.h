@@ -1,0 +1,60 @@
+#pragma once
+
+#include "platform/Clock.h"
+#include "platform/MainLoop.h"
+#include "platform/linux/Descriptor.h"
+
+#include <atomic>
+#include <mutex>
+#include <optional>
+#include <vector>
+
+namespace platform {
+
+/// A main loop of poll(2), for programs without another one. A turn runs what is readable, then the timers
+/// that are due, earliest first, then the tasks that were posted before it. Handles may outlive the loop.
+class PollMainLoop final : public MainLoop {
+public:
+    /// Timers go by `clock`, which must outlive the loop.
+    explicit PollMainLoop(const Clock& clock);
+
+    void post(Task task) override;
+    std::unique_ptr<Handle> startTimer(Milliseconds delay, Milliseconds interval, Task task) override;
+    std::unique_ptr<Handle> watchReadable(int descriptor, Task task) override;
+
+    /// Turns until `quit`. A quit from before counts.
+    void run();
+
+    /// Any thread.
+    void quit();
+
+    /// Turns until `condition` holds, asking before every turn; false when it does not within `patience`,
+    /// which is real time whatever the clock says.
+    bool runUntil(const std::function<bool()>& condition, Milliseconds patience);
+
+    /// One turn, waiting no longer than `patience` for something to do. Whether there was something.
+    bool turn(Milliseconds patience);
+
+    /// When the next timer is due.
+    std::optional<Clock::Instant> nextTimer() const;
+
+private:
+    struct Timer;
+    struct Watch;
+    static constexpr Milliseconds forever{-1};
+
+    int pollTimeout(Milliseconds patience) const;
+    bool runReadable(Milliseconds patience);
+    bool runTimers();
+    bool runPosted(std::vector<Task>& tasks);
+
+    const Clock& m_clock;
+    Descriptor m_wake;
+    std::vector<std::shared_ptr<Timer>> m_timers;
+    std::vector<std::shared_ptr<Watch>> m_watches;
+    std::mutex m_mutex;
+    std::vector<Task> m_posted; ///< guarded by m_mutex
+    std::atomic<bool> m_quit = false;
+};
+
+} // namespace platform

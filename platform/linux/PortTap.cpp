@@ -1,0 +1,62 @@
+#include "platform/linux/PortTap.h"
+
+#include "lib/plist/Binary.h"
+#include "platform/linux/IncomingConnection.h"
+
+namespace platform {
+
+void PortTap::add(const std::shared_ptr<IncomingConnection>& watcher, std::uint64_t sequence) {
+    const std::lock_guard lock(m_mutex);
+    std::erase_if(m_watchers, [](const Watcher& each) { return each.connection.expired(); });
+    m_watchers.push_back({watcher});
+    m_isWatched = true;
+    const auto told = statistics();
+    const std::span<const std::byte> pieces[] = {told.span()};
+    const auto packet = OutgoingPacket::make(pieces, false, sequence);
+    if (packet) packet->sendCopy(watcher->socket(), PacketHeader::tap | PacketHeader::isAnswer, sequence);
+}
+
+void PortTap::didReceive(const PacketHeader& header, const SharedBytes& payload, int sender) {
+    ++counters.received;
+    if (!m_isWatched) return;
+    const std::span<const std::byte> pieces[] = {payload.span()};
+    const auto flags = header.flags & PacketHeader::wantsAnswer;
+    if (const auto packet = OutgoingPacket::make(pieces, false, 0))
+        copy(*packet, static_cast<std::uint16_t>(flags), sender);
+}
+
+void PortTap::didSend(const OutgoingPacket& packet, int socket) {
+    ++counters.sent;
+    if (!m_isWatched) return;
+    ucred receiver = {};
+    socklen_t size = sizeof receiver;
+    getsockopt(socket, SOL_SOCKET, SO_PEERCRED, &receiver, &size);
+    const auto flags = packet.wantsAnswer() ? PacketHeader::wantsAnswer : 0;
+    copy(packet, static_cast<std::uint16_t>(flags | PacketHeader::outgoing), receiver.pid);
+}
+
+/// A watcher who does not keep up misses what there is no room for, and sees it by the count.
+void PortTap::copy(const OutgoingPacket& packet, std::uint16_t flags, int otherEnd) {
+    flags = static_cast<std::uint16_t>(flags | PacketHeader::tap);
+    const std::lock_guard lock(m_mutex);
+    std::erase_if(m_watchers, [&](Watcher& watcher) {
+        const auto connection = watcher.connection.lock();
+        if (!connection) return true;
+        const auto sequence = std::uint64_t{watcher.count++} << 32 | static_cast<std::uint32_t>(otherEnd);
+        return packet.sendCopy(connection->socket(), flags, sequence) == Sending::hungUp;
+    });
+    m_isWatched = !m_watchers.empty();
+}
+
+SharedBytes PortTap::statistics() const {
+    const plist::Dictionary values{{"connections", counters.connections - m_watchers.size()},
+                                   {"received", counters.received.load()},
+                                   {"sent", counters.sent.load()},
+                                   {"queued", counters.queued.load()},
+                                   {"queuedBytes", counters.queuedBytes.load()},
+                                   {"dropped", counters.dropped.load()}};
+    std::string error;
+    return plist::WriteBinary(values, error).joined();
+}
+
+} // namespace platform

@@ -1,0 +1,172 @@
+#include "platform/linux/QtWindowServer.h"
+
+#include "lib/base/Geometry.h"
+#include "platform/WindowServer.h"
+#include "platform/linux/PanelPlacement.h"
+#include "platform/linux/QtScreenCoordinates.h"
+#include "platform/linux/ReducedMotion.h"
+#include "platform/linux/XcbPanel.h"
+
+#include <QAbstractNativeEventFilter>
+#include <QApplication>
+#include <QCursor>
+#include <QImage>
+#include <QKeyEvent>
+#include <QPixmap>
+#include <QWidget>
+#include <QWindow>
+#include <algorithm>
+#include <cstdint>
+#include <functional>
+#include <memory>
+#include <utility>
+
+namespace platform {
+
+namespace {
+
+constexpr unsigned lastRealButton = 3; // the wheel is made of buttons too
+
+/// The toolkit lets only a widget itself give its native window back.
+struct NativeWindowOwner : QWidget {
+    using QWidget::destroy;
+};
+
+class QtPanelWindow final : public PanelWindow, private QObject, private QAbstractNativeEventFilter {
+public:
+    QtPanelWindow(QWidget& contentView, PanelDelegate& delegate, std::function<KXRect()> ownArea)
+        : m_view(contentView)
+        , m_delegate(delegate)
+        , m_ownArea(std::move(ownArea))
+        , m_frame(ScreenRectFromQt(contentView.geometry())) {
+        m_view.setWindowFlags(Qt::Window | Qt::FramelessWindowHint | Qt::X11BypassWindowManagerHint);
+        m_view.setAttribute(Qt::WA_TranslucentBackground, XcbIsCompositing());
+        m_view.installEventFilter(this);
+        qGuiApp->installNativeEventFilter(this);
+        XcbWatchButtonPresses();
+    }
+    ~QtPanelWindow() override { qGuiApp->removeNativeEventFilter(this); }
+    QtPanelWindow(const QtPanelWindow&) = delete;
+    QtPanelWindow& operator=(const QtPanelWindow&) = delete;
+
+    KXRect frame() const override { return m_frame; }
+
+    void setFrame(const KXRect& frame) override {
+        m_frame = frame;
+        place();
+    }
+
+    bool isVisible() const override { return m_view.isVisible(); }
+
+    void makeKeyAndOrderFront() override {
+        if (!isVisible()) {
+            m_activeBefore = XcbActiveWindow();
+            followCompositor();
+        }
+        place();
+        m_view.show();
+        m_view.raise();
+        m_view.activateWindow();
+        m_view.windowHandle()->installEventFilter(this); // once, however often
+        XcbTakeInputFocus(nativeWindow());
+    }
+
+    void orderOut() override {
+        if (!isVisible()) return;
+        const bool isKey = XcbHasInputFocus(nativeWindow());
+        m_view.hide();
+        if (isKey) XcbActivateWindow(m_activeBefore);
+    }
+
+    void addWindowFilter() override {
+        m_hasFilter = true;
+        XcbBlurBehind(nativeWindow());
+    }
+
+    QImage screenBelow() const override {
+        QScreen* screen = ScreenAt(m_view.geometry().center());
+        if (!screen || XcbHidesOtherWindows()) return {};
+        // The point past the right edge is not there to be seen.
+        const QRect seen = m_view.geometry().intersected(screen->geometry());
+        const QPoint corner = seen.topLeft() - screen->geometry().topLeft();
+        return screen->grabWindow(0, corner.x(), corner.y(), seen.width(), seen.height()).toImage();
+    }
+
+private:
+    std::uint32_t nativeWindow() const { return static_cast<std::uint32_t>(m_view.winId()); }
+
+    /// Whether a window is see-through is decided when it is made, so it is made anew where that changed.
+    void followCompositor() {
+        const bool translucent = XcbIsCompositing();
+        if (translucent == m_view.testAttribute(Qt::WA_TranslucentBackground)) return;
+        (m_view.*&NativeWindowOwner::destroy)(true, true);
+        m_view.setAttribute(Qt::WA_NoSystemBackground, translucent);
+        m_view.setAttribute(Qt::WA_TranslucentBackground, translucent);
+        if (m_hasFilter) XcbBlurBehind(nativeWindow());
+    }
+
+    void place() {
+        const KXRect item = m_ownArea();
+        const QScreen* screen = ScreenAt(QtRectFromScreen(item).center());
+        const KXRect available = screen ? ScreenRectFromQt(screen->availableGeometry()) : m_frame;
+        const KXRect frame = PlacePanel(m_frame, item, available, QGuiApplication::isRightToLeft());
+        m_view.setGeometry(QtRectFromScreen(frame).toRect());
+    }
+
+    bool eventFilter(QObject* watched, QEvent* event) override {
+        if (watched == &m_view && event->type() == QEvent::WindowDeactivate) m_delegate.panelDidResignKey();
+        const bool isKeyEvent = event->type() == QEvent::KeyPress || event->type() == QEvent::KeyRelease;
+        if (isKeyEvent && watched == m_view.windowHandle() &&
+            static_cast<const QKeyEvent*>(event)->key() == Qt::Key_Alt) {
+            const bool down = event->type() == QEvent::KeyPress;
+            QMetaObject::invokeMethod(
+                this, [this, down] { m_delegate.panelFlagsChanged(down); }, Qt::QueuedConnection);
+        }
+        return false;
+    }
+
+    bool nativeEventFilter(const QByteArray& eventType, void* message, qintptr*) override {
+        if (eventType != "xcb_generic_event_t" || !isVisible()) return false;
+        const auto button = XcbPressedButton(message);
+        if (button && *button <= lastRealButton && isOutside(QCursor::pos())) m_delegate.panelDidResignKey();
+        return false;
+    }
+
+    bool isOutside(QPoint point) const {
+        if (QtRectFromScreen(m_ownArea()).contains(point)) return false;
+        const auto windows = QGuiApplication::topLevelWindows();
+        return std::none_of(windows.begin(), windows.end(), [point](const QWindow* window) {
+            return window->isVisible() && window->geometry().contains(point);
+        });
+    }
+
+    QWidget& m_view;
+    PanelDelegate& m_delegate;
+    std::function<KXRect()> m_ownArea;
+    KXRect m_frame;
+    std::uint32_t m_activeBefore = 0;
+    bool m_hasFilter = false;
+};
+
+} // namespace
+
+KXRect QtWindowServer::visibleFrame() const {
+    const QScreen* screen = QGuiApplication::primaryScreen();
+    return screen ? ScreenRectFromQt(screen->availableGeometry()) : KXRect{};
+}
+
+bool QtWindowServer::hasWindowFilter() const {
+    const static bool hasFilter = XcbAnnouncesBlurBehind();
+    return hasFilter;
+}
+
+bool QtWindowServer::reducesMotion() const {
+    return DesktopReducesMotion();
+}
+
+std::unique_ptr<PanelWindow> QtWindowServer::makePanel(QWidget& contentView, PanelDelegate& delegate,
+                                                       std::function<KXRect()> ownArea) {
+    return std::make_unique<QtPanelWindow>(contentView, delegate, std::move(ownArea));
+}
+
+} // namespace platform

@@ -1,0 +1,27 @@
+#include "platform/linux/StatusItemWidget.h"
+
+#include <QMouseEvent>
+#include <QPainter>
+
+namespace platform {
+
+StatusItemWidget::StatusItemWidget(StatusItemView& view, Qt::WindowFlags flags)
+    : QWidget(nullptr, Qt::Window | Qt::FramelessWindowHint | Qt::WindowDoesNotAcceptFocus | flags)
+    , m_view(view) {
+    setAttribute(Qt::WA_ShowWithoutActivating);
+    setWindowTitle(QStringLiteral("Tessel status item"));
+    setToolTip(QString::fromStdString(view.toolTip()));
+    setAccessibleName(toolTip());
+}
+
+void StatusItemWidget::paintEvent(QPaintEvent*) {
+    QPainter painter(this);
+    m_view.draw(painter, {static_cast<float>(width()), static_cast<float>(height())});
+}
+
+void StatusItemWidget::mousePressEvent(QMouseEvent* event) {
+    if (event->button() == Qt::LeftButton) m_view.mouseDown();
+    if (event->button() == Qt::RightButton) m_view.rightMouseDown();
+}
+
+} // namespace platform

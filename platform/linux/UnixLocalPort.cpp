@@ -1,0 +1,190 @@
+#include "platform/linux/UnixLocalPort.h"
+
+#include "lib/base/Log.h"
+#include "platform/Clock.h"
+#include "platform/MessagePort.h"
+#include "platform/linux/Backlog.h"
+#include "platform/linux/IncomingConnection.h"
+#include "platform/linux/PeerIdentity.h"
+#include "platform/linux/PortNames.h"
+#include "platform/linux/PortPacket.h"
+
+#include <cstddef>
+#include <cstdint>
+#include <fcntl.h>
+#include <functional>
+#include <memory>
+#include <mutex>
+#include <optional>
+#include <sys/epoll.h>
+#include <sys/eventfd.h>
+
+#include <algorithm>
+#include <array>
+#include <cerrno>
+#include <span>
+#include <sys/socket.h>
+#include <unistd.h>
+#include <utility>
+
+namespace platform {
+
+namespace {
+constexpr std::uint64_t wakeTag = 0;
+constexpr std::uint64_t listenerTag = 1;
+constexpr int connectionsOfSender = 16; // the library keeps one, and opens another now and then to look
+} // namespace
+
+UnixLocalPort::UnixLocalPort(OwnedName name, const Clock& clock, PortTap& tap)
+    : m_clock(clock)
+    , m_tap(tap)
+    , m_label(name.name())
+    , m_wake(std::make_shared<const Descriptor>(eventfd(0, EFD_CLOEXEC | EFD_NONBLOCK)))
+    , m_backlog(std::make_shared<Backlog>([wake = m_wake] { eventfd_write(wake->get(), 1); }))
+    , m_epoll(epoll_create1(EPOLL_CLOEXEC))
+    , m_spare(::open("/dev/null", O_RDONLY | O_CLOEXEC))
+    , m_name(std::move(name))
+    , m_lastTag(listenerTag) {
+    watch(m_wake->get(), wakeTag);
+    watch(m_name->listener(), listenerTag);
+}
+
+UnixLocalPort::~UnixLocalPort() {
+    close();
+}
+
+void UnixLocalPort::run(const std::function<void(Arrival)>& receiver) {
+    PacketReader reader;
+    std::array<epoll_event, 64> events;
+    while (!m_closed) {
+        const int count = epoll_wait(m_epoll.get(), events.data(), static_cast<int>(events.size()), -1);
+        if (count < 0 && errno != EINTR) return;
+        for (const auto& event : std::span(events).first(static_cast<std::size_t>(std::max(count, 0)))) {
+            if (event.data.u64 == wakeTag)
+                resumePaused();
+            else if (event.data.u64 == listenerTag)
+                accept();
+            else if (auto arrival = read(event.data.u64, reader))
+                receiver(std::move(*arrival));
+        }
+    }
+}
+
+void UnixLocalPort::close() {
+    const std::lock_guard lock(m_mutex);
+    m_closed = true;
+    m_name.reset();
+    for (const auto& connection : m_connections)
+        connection.second->close();
+    m_tap.counters.connections -= m_connections.size();
+    m_connections.clear();
+    eventfd_write(m_wake->get(), 1);
+}
+
+void UnixLocalPort::watch(int descriptor, std::uint64_t tag) {
+    epoll_event event = {};
+    event.events = EPOLLIN;
+    event.data.u64 = tag;
+    epoll_ctl(m_epoll.get(), EPOLL_CTL_ADD, descriptor, &event);
+}
+
+void UnixLocalPort::accept() {
+    const std::lock_guard lock(m_mutex);
+    if (!m_name) return;
+    Descriptor socket(accept4(m_name->listener(), nullptr, nullptr, SOCK_CLOEXEC | SOCK_NONBLOCK));
+    if (!socket && (errno == EMFILE || errno == ENFILE)) return refuseOne();
+    if (!socket) return;
+
+    ucred sender = {};
+    socklen_t size = sizeof sender;
+    getsockopt(socket.get(), SOL_SOCKET, SO_PEERCRED, &sender, &size);
+    if (sender.uid != geteuid()) return complain(sender.pid, "another user's");
+    const auto isOfSender = [&](const auto& entry) { return entry.second->peer().processID == sender.pid; };
+    if (std::ranges::count_if(m_connections, isOfSender) >= connectionsOfSender)
+        return complain(sender.pid, "too many");
+    const PortPeer peer{sender.pid, SerialNumberOfPeer(sender.pid)};
+    const auto tag = ++m_lastTag;
+    watch(socket.get(), tag);
+    m_connections.emplace(tag, std::make_shared<IncomingConnection>(std::move(socket), peer, m_backlog));
+    ++m_tap.counters.connections;
+}
+
+void UnixLocalPort::refuseOne() {
+    m_spare.reset();
+    Descriptor(accept4(m_name->listener(), nullptr, nullptr, SOCK_CLOEXEC));
+    m_spare.reset(::open("/dev/null", O_RDONLY | O_CLOEXEC));
+    complain(0, "no descriptor left");
+}
+
+std::optional<Arrival> UnixLocalPort::read(std::uint64_t tag, PacketReader& reader) {
+    const std::lock_guard lock(m_mutex);
+    const auto found = m_connections.find(tag);
+    if (found == m_connections.end()) return std::nullopt;
+    const auto& connection = *found->second;
+    if (!m_backlog->admits(connection.peer().processID)) {
+        pause(tag);
+        return std::nullopt;
+    }
+    IncomingPacket packet;
+    switch (reader.read(connection.socket(), packet)) {
+    case Reading::packet:
+        if (packet.sender.uid == geteuid() && packet.sender.pid == connection.peer().processID)
+            return take(found->second, std::move(packet));
+        packet.fault = "sent by another process";
+        [[fallthrough]];
+    case Reading::bad:
+        complain(connection.peer().processID, packet.fault);
+        [[fallthrough]];
+    case Reading::end:
+        remove(tag);
+        return std::nullopt;
+    case Reading::nothing:
+        return std::nullopt;
+    }
+    return std::nullopt;
+}
+
+std::optional<Arrival> UnixLocalPort::take(const std::shared_ptr<IncomingConnection>& connection,
+                                           IncomingPacket packet) {
+    if (packet.header.isTap()) {
+        m_tap.add(connection, packet.header.sequence);
+        return std::nullopt;
+    }
+    m_tap.didReceive(packet.header, packet.payload, connection->peer().processID);
+    return Arrival{std::move(packet.payload), connection->peer(), connection->receipt(packet.header)};
+}
+
+void UnixLocalPort::pause(std::uint64_t tag) {
+    // Asking for no events looks enough, and still wakes us at every turn once the sender has hung up.
+    epoll_ctl(m_epoll.get(), EPOLL_CTL_DEL, m_connections.at(tag)->socket(), nullptr);
+    m_paused.push_back(tag);
+}
+
+void UnixLocalPort::resumePaused() {
+    eventfd_t ignored;
+    eventfd_read(m_wake->get(), &ignored);
+    const std::lock_guard lock(m_mutex);
+    std::erase_if(m_paused, [this](std::uint64_t tag) {
+        const auto found = m_connections.find(tag);
+        if (found == m_connections.end()) return true;
+        if (!m_backlog->admits(found->second->peer().processID)) return false;
+        watch(found->second->socket(), tag);
+        return true;
+    });
+}
+
+void UnixLocalPort::remove(std::uint64_t tag) {
+    const auto found = m_connections.find(tag);
+    // The socket may stay open for its receipts; it would be readable at every turn.
+    epoll_ctl(m_epoll.get(), EPOLL_CTL_DEL, found->second->socket(), nullptr);
+    found->second->close();
+    m_connections.erase(found);
+    --m_tap.counters.connections;
+}
+
+void UnixLocalPort::complain(int processID, const char* fault) {
+    if (!m_logLimit.allows(processID, m_clock.now())) return;
+    Log("IPC: %s: closing the connection of process %d: %s\n", m_label.c_str(), processID, fault);
+}
+
+} // namespace platform

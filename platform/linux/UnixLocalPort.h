@@ -1,0 +1,62 @@
+#pragma once
+
+#include "lib/base/LogLimit.h"
+#include "platform/Clock.h"
+#include "platform/MessagePort.h"
+#include "platform/linux/PortNames.h"
+#include "platform/linux/PortPacket.h"
+#include "platform/linux/PortTap.h"
+
+#include <atomic>
+#include <cstdint>
+#include <mutex>
+#include <unordered_map>
+#include <vector>
+
+namespace platform {
+
+class Backlog;
+class IncomingConnection;
+
+/// A port under a name of ours. Senders are served in turns, a packet each, so that none crowds out another,
+/// and one who is ahead of the main thread is not read until that has caught up. Who sends what is no packet,
+/// or in another process's name, is cut off.
+class UnixLocalPort final : public LocalPort {
+public:
+    UnixLocalPort(OwnedName name, const Clock& clock, PortTap& tap);
+    ~UnixLocalPort() override;
+    UnixLocalPort(const UnixLocalPort&) = delete;
+    UnixLocalPort& operator=(const UnixLocalPort&) = delete;
+
+    void run(const std::function<void(Arrival)>& receiver) override;
+    void close() override;
+
+private:
+    void watch(int descriptor, std::uint64_t tag);
+    void accept();
+    void refuseOne();
+    std::optional<Arrival> read(std::uint64_t tag, PacketReader& reader);
+    std::optional<Arrival> take(const std::shared_ptr<IncomingConnection>& connection, IncomingPacket packet);
+    void pause(std::uint64_t tag);
+    void resumePaused();
+    void remove(std::uint64_t tag);
+    void complain(int processID, const char* fault);
+
+    const Clock& m_clock;
+    PortTap& m_tap;
+    const std::string m_label;
+    const std::shared_ptr<const Descriptor> m_wake; ///< receipts may outlive the port
+    const std::shared_ptr<Backlog> m_backlog;
+    Descriptor m_epoll;
+    Descriptor m_spare; ///< given up for a moment to refuse a connection when there are no descriptors left
+    std::atomic<bool> m_closed = false;
+
+    std::mutex m_mutex; ///< guards what follows
+    std::optional<OwnedName> m_name;
+    std::unordered_map<std::uint64_t, std::shared_ptr<IncomingConnection>> m_connections;
+    std::vector<std::uint64_t> m_paused; ///< those not read for now
+    std::uint64_t m_lastTag;
+    LogLimit m_logLimit;
+};
+
+} // namespace platform

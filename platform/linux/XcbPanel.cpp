@@ -1,0 +1,127 @@
+#include "platform/linux/XcbPanel.h"
+
+#include "platform/linux/XcbConnection.h"
+
+#include <QGuiApplication>
+#include <QScreen>
+#include <QWindow>
+#include <algorithm>
+#include <cstdint>
+#include <cstring>
+#include <optional>
+#include <xcb/xcb.h>
+#include <xcb/xinput.h>
+#include <xcb/xproto.h>
+
+namespace platform {
+
+namespace {
+
+constexpr const char* blurBehind = "_KDE_NET_WM_BLUR_BEHIND_REGION";
+
+} // namespace
+
+bool XcbIsCompositing() {
+    auto* c = XcbConnection();
+    if (!c) return false;
+    const auto cookie = xcb_get_selection_owner(c, XcbAtom(c, "_NET_WM_CM_S0"));
+    const XcbReply<xcb_get_selection_owner_reply_t> reply(xcb_get_selection_owner_reply(c, cookie, nullptr));
+    return reply && reply->owner != XCB_WINDOW_NONE;
+}
+
+bool XcbAnnouncesBlurBehind() {
+    auto* c = XcbConnection();
+    if (!c) return false;
+    const auto atom = XcbAtom(c, blurBehind);
+    const XcbReply<xcb_list_properties_reply_t> reply(
+        xcb_list_properties_reply(c, xcb_list_properties(c, XcbRootWindow(c)), nullptr));
+    if (!reply) return false;
+    const xcb_atom_t* atoms = xcb_list_properties_atoms(reply.get());
+    const xcb_atom_t* end = atoms + xcb_list_properties_atoms_length(reply.get());
+    return std::find(atoms, end, atom) != end;
+}
+
+void XcbBlurBehind(std::uint32_t window) {
+    auto* c = XcbConnection();
+    if (!c) return;
+    // A region without a rectangle stands for the whole window, whatever its size becomes.
+    xcb_change_property(c, XCB_PROP_MODE_REPLACE, window, XcbAtom(c, blurBehind), XCB_ATOM_CARDINAL, 32, 0,
+                        nullptr);
+    xcb_flush(c);
+}
+
+bool XcbHidesOtherWindows() {
+    auto* c = XcbConnection();
+    if (!c) return true;
+    constexpr char extension[] = "XWAYLAND";
+    const XcbReply<xcb_query_extension_reply_t> reply(
+        xcb_query_extension_reply(c, xcb_query_extension(c, sizeof extension - 1, extension), nullptr));
+    if (reply && reply->present) return true;
+    // Older ones lack the extension, but name their outputs so.
+    const QScreen* screen = QGuiApplication::primaryScreen();
+    return screen && screen->name().startsWith(QLatin1String(extension));
+}
+
+std::uint32_t XcbActiveWindow() {
+    auto* c = XcbConnection();
+    if (!c) return 0;
+    const auto cookie =
+        xcb_get_property(c, 0, XcbRootWindow(c), XcbAtom(c, "_NET_ACTIVE_WINDOW"), XCB_ATOM_WINDOW, 0, 1);
+    const XcbReply<xcb_get_property_reply_t> reply(xcb_get_property_reply(c, cookie, nullptr));
+    if (!reply || xcb_get_property_value_length(reply.get()) < 4) return 0;
+    std::uint32_t window = 0;
+    std::memcpy(&window, xcb_get_property_value(reply.get()), sizeof window);
+    return window;
+}
+
+bool XcbHasInputFocus(std::uint32_t window) {
+    auto* c = XcbConnection();
+    if (!c) return false;
+    const XcbReply<xcb_get_input_focus_reply_t> reply(
+        xcb_get_input_focus_reply(c, xcb_get_input_focus(c), nullptr));
+    return reply && reply->focus == window;
+}
+
+bool XcbHasInputFocus() {
+    const auto windows = QGuiApplication::topLevelWindows();
+    return std::any_of(windows.begin(), windows.end(), [](const QWindow* window) {
+        return window->isVisible() && XcbHasInputFocus(static_cast<std::uint32_t>(window->winId()));
+    });
+}
+
+void XcbTakeInputFocus(std::uint32_t window) {
+    auto* c = XcbConnection();
+    if (!c) return;
+    xcb_set_input_focus(c, XCB_INPUT_FOCUS_PARENT, window, XCB_CURRENT_TIME);
+    xcb_flush(c);
+}
+
+void XcbActivateWindow(std::uint32_t window) {
+    auto* c = XcbConnection();
+    if (!c || window == 0) return;
+    constexpr std::uint32_t sourcePager = 2; // "application" may be refused
+    XcbSendToRoot(c, window, "_NET_ACTIVE_WINDOW", {sourcePager, XCB_CURRENT_TIME, 0, 0, 0});
+    xcb_flush(c);
+}
+
+void XcbWatchButtonPresses() {
+    auto* c = XcbConnection();
+    if (!c) return;
+    struct {
+        xcb_input_event_mask_t head;
+        std::uint32_t mask;
+    } selection{{XCB_INPUT_DEVICE_ALL_MASTER, 1}, XCB_INPUT_XI_EVENT_MASK_RAW_BUTTON_PRESS};
+    xcb_input_xi_select_events(c, XcbRootWindow(c), 1, &selection.head);
+    xcb_flush(c);
+}
+
+std::optional<unsigned> XcbPressedButton(const void* nativeEvent) {
+    const auto* event = static_cast<const xcb_ge_generic_event_t*>(nativeEvent);
+    if ((event->response_type & 0x7F) != XCB_GE_GENERIC || event->event_type != XCB_INPUT_RAW_BUTTON_PRESS)
+        return {};
+    const auto* extension = xcb_get_extension_data(XcbConnection(), &xcb_input_id);
+    if (!extension || event->extension != extension->major_opcode) return {};
+    return static_cast<const xcb_input_raw_button_press_event_t*>(nativeEvent)->detail;
+}
+
+} // namespace platform

@@ -1,0 +1,33 @@
+#pragma once
+
+#include <cstdint>
+#include <optional>
+
+/// What a panel needs of the X server beyond the toolkit. Everything does nothing without one.
+namespace platform {
+
+/// Whether a compositing manager runs.
+bool XcbIsCompositing();
+
+/// Whether the compositing manager says that it blurs what lies behind windows.
+bool XcbAnnouncesBlurBehind();
+/// Asks it to, behind the whole window.
+void XcbBlurBehind(std::uint32_t window);
+/// Whether a picture of the screen would be black: true under Wayland's X server.
+bool XcbHidesOtherWindows();
+
+/// The window that the window manager counts as active; 0 for none.
+std::uint32_t XcbActiveWindow();
+bool XcbHasInputFocus(std::uint32_t window);
+/// Whether any visible window of this process has the keyboard.
+bool XcbHasInputFocus();
+void XcbTakeInputFocus(std::uint32_t window);
+/// Asks the window manager to make the window active again.
+void XcbActivateWindow(std::uint32_t window);
+
+/// Asks for presses of buttons anywhere on the screen, whoever gets them.
+void XcbWatchButtonPresses();
+/// The button, if the native event is such a press.
+std::optional<unsigned> XcbPressedButton(const void* nativeEvent);
+
+} // namespace platform

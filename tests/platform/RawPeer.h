@@ -1,0 +1,145 @@
+#pragma once
+
+#include "platform/linux/PortPacket.h"
+
+#include <gtest/gtest.h>
+
+#include <fcntl.h>
+#include <poll.h>
+#include <sys/mman.h>
+#include <sys/un.h>
+
+#include <string>
+#include <vector>
+
+/// What a peer may send, byte for byte.
+struct RawPacket {
+    std::string what;
+    std::string bytes;
+    std::vector<std::shared_ptr<platform::Descriptor>> descriptors{};
+};
+
+/// A peer without the library.
+class RawPeer {
+public:
+    RawPeer(const std::string& directory, const std::string& name)
+        : m_socket(socket(AF_UNIX, SOCK_SEQPACKET | SOCK_CLOEXEC, 0)) {
+        sockaddr_un address = {};
+        address.sun_family = AF_UNIX;
+        (directory + '/' + name).copy(address.sun_path, sizeof address.sun_path - 1);
+        EXPECT_EQ(connect(m_socket.get(), reinterpret_cast<const sockaddr*>(&address), sizeof address), 0);
+    }
+
+    void send(const RawPacket& packet) {
+        auto bytes = packet.bytes;
+        iovec vector{bytes.data(), bytes.size()};
+        msghdr message = {};
+        message.msg_iov = &vector;
+        message.msg_iovlen = 1;
+        std::vector<int> numbers;
+        for (const auto& descriptor : packet.descriptors)
+            numbers.push_back(descriptor->get());
+        std::vector<std::byte> control(CMSG_SPACE(numbers.size() * sizeof(int)));
+        if (!numbers.empty()) {
+            message.msg_control = control.data();
+            message.msg_controllen = control.size();
+            auto* rights = CMSG_FIRSTHDR(&message);
+            *rights = {CMSG_LEN(numbers.size() * sizeof(int)), SOL_SOCKET, SCM_RIGHTS};
+            std::memcpy(CMSG_DATA(rights), numbers.data(), numbers.size() * sizeof(int));
+        }
+        EXPECT_EQ(sendmsg(m_socket.get(), &message, MSG_NOSIGNAL), static_cast<ssize_t>(bytes.size()));
+    }
+
+    /// The connection may be gone by now.
+    void trySend(const std::string& bytes) {
+        ::send(m_socket.get(), bytes.data(), bytes.size(), MSG_NOSIGNAL);
+    }
+    /// Like recv, waiting.
+    ssize_t receive(void* to, std::size_t size) { return recv(m_socket.get(), to, size, 0); }
+
+    /// Waits for the end of the connection; false when an answer comes instead, or nothing.
+    bool isCutOff() {
+        pollfd polled{m_socket.get(), POLLIN, 0};
+        char byte;
+        return poll(&polled, 1, 20'000) == 1 && recv(m_socket.get(), &byte, 1, MSG_DONTWAIT) <= 0;
+    }
+
+private:
+    platform::Descriptor m_socket;
+};
+
+inline std::string RawHeader(platform::PacketHeader header) {
+    return {reinterpret_cast<const char*>(&header), sizeof header};
+}
+
+inline std::shared_ptr<platform::Descriptor> Memory(const std::string& contents, int seals) {
+    auto memory =
+        std::make_shared<platform::Descriptor>(memfd_create("test", MFD_CLOEXEC | MFD_ALLOW_SEALING));
+    EXPECT_EQ(write(memory->get(), contents.data(), contents.size()), static_cast<ssize_t>(contents.size()));
+    EXPECT_EQ(fcntl(memory->get(), F_ADD_SEALS, seals), 0);
+    return memory;
+}
+
+constexpr int allSeals = F_SEAL_SEAL | F_SEAL_SHRINK | F_SEAL_GROW | F_SEAL_WRITE;
+
+inline std::vector<RawPacket> GoodPackets() {
+    using platform::PacketHeader;
+    return {{"inline", RawHeader({.payloadLength = 7}) + "payload"},
+            {"in memory",
+             RawHeader({.flags = PacketHeader::inMemory, .payloadLength = 7}),
+             {Memory("payload", allSeals)}}};
+}
+
+inline std::vector<RawPacket> BadPackets() {
+    using platform::Descriptor;
+    using platform::PacketHeader;
+    constexpr auto inMemory = PacketHeader::inMemory;
+    const auto sealed = Memory("payload", allSeals);
+    const auto file = std::make_shared<Descriptor>(open("/proc/self/exe", O_RDONLY | O_CLOEXEC));
+    constexpr auto terabyte = std::size_t{1} << 40;
+    const auto sparse = Memory("", 0);
+    EXPECT_EQ(ftruncate(sparse->get(), terabyte), 0);
+    EXPECT_EQ(fcntl(sparse->get(), F_ADD_SEALS, allSeals), 0);
+    const auto pipeEnd = [] {
+        int ends[2];
+        EXPECT_EQ(pipe2(ends, O_CLOEXEC), 0);
+        close(ends[1]);
+        return std::make_shared<Descriptor>(ends[0]);
+    };
+    const auto memoryHeader = RawHeader({.flags = inMemory, .payloadLength = 7});
+    const std::string tooLong(platform::maximalInlinePayload + 1, 'x');
+    std::vector<RawPacket> packets{
+        {"half a header", RawHeader({}).substr(0, 12)},
+        {"wrong magic", RawHeader({.magic = {'K', 'X', 'P', 'c'}})},
+        {"wrong version", RawHeader({.version = 2})},
+        {"unknown flag", RawHeader({.flags = 1 << 5})},
+        {"a copy", RawHeader({.flags = PacketHeader::tap | PacketHeader::outgoing})},
+        {"watching with a payload", RawHeader({.flags = PacketHeader::tap, .payloadLength = 7}) + "payload"},
+        {"an answer", RawHeader({.flags = PacketHeader::isAnswer})},
+        {"length too large by one", RawHeader({.payloadLength = 8}) + "payload"},
+        {"length too small by one", RawHeader({.payloadLength = 6}) + "payload"},
+        {"absurd length", RawHeader({.payloadLength = ~0ULL}) + "payload"},
+        {"more than goes inline", RawHeader({.payloadLength = tooLong.size()}) + tooLong},
+        {"no descriptor", memoryHeader},
+        {"two descriptors", memoryHeader, {sealed, sealed}},
+        {"ten descriptors", memoryHeader, std::vector(10, sealed)},
+        {"a descriptor too many", RawHeader({.payloadLength = 7}) + "payload", {sealed}},
+        {"payload in both places", memoryHeader + "payload", {sealed}},
+        {"a pipe", memoryHeader, {pipeEnd()}},
+        {"a file", memoryHeader, {file}},
+        {"empty memory", RawHeader({.flags = inMemory}), {Memory("", allSeals)}},
+        {"memory too small", RawHeader({.flags = inMemory, .payloadLength = 8}), {sealed}},
+        {"memory too large", RawHeader({.flags = inMemory, .payloadLength = 6}), {sealed}},
+        {"over the cap",
+         RawHeader({.flags = inMemory, .payloadLength = platform::maximalPayload + 1}),
+         {sealed}},
+        {"a sparse terabyte", RawHeader({.flags = inMemory, .payloadLength = terabyte}), {sparse}},
+        {"a sparse terabyte that says it is less", memoryHeader, {sparse}},
+        {"nothing at all", ""},
+    };
+    for (const int missing : {F_SEAL_SEAL, F_SEAL_SHRINK, F_SEAL_GROW, F_SEAL_WRITE})
+        packets.push_back({"without seal " + std::to_string(missing),
+                           memoryHeader,
+                           {Memory("payload", allSeals & ~missing)}});
+    return packets;
+}

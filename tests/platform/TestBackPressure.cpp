@@ -1,0 +1,119 @@
+#include "platform/linux/Backlog.h"
+#include "tests/platform/PortWorlds.h"
+#include "tests/platform/RawPeer.h"
+
+#include <gmock/gmock.h>
+
+#include <sys/wait.h>
+
+// What becomes of more than a receiver's main thread can handle.
+
+using namespace std::chrono_literals;
+using namespace platform;
+
+namespace {
+
+const std::string name = "com.example.port";
+
+int NumberOf(const Arrival& arrival) {
+    return std::atoi(reinterpret_cast<const char*>(arrival.bytes.data())); // it goes on after the digits
+}
+
+class BackPressure : public testing::Test {
+protected:
+    int logEntries(const std::string& text) const {
+        const auto log = ScratchHome::log();
+        int count = 0;
+        for (auto at = log.find(text); at != log.npos; at = log.find(text, at + 1))
+            ++count;
+        return count;
+    }
+    UnixWorld world;
+};
+
+} // namespace
+
+TEST(Backlog, admitsEachSenderUpToItsQuotaAndAllUpToTheWhole) {
+    int calls = 0;
+    Backlog backlog([&] { ++calls; });
+    const auto [messages, bytes] = Backlog::ofSender;
+    for (std::size_t i = 0; i < messages; ++i) {
+        EXPECT_TRUE(backlog.admits(1));
+        backlog.add(1, 0);
+    }
+    EXPECT_FALSE(backlog.admits(1));
+    EXPECT_TRUE(backlog.admits(2));
+    backlog.add(2, bytes - 1);
+    EXPECT_TRUE(backlog.admits(2));
+    backlog.add(2, Backlog::ofAll.bytes);
+    EXPECT_FALSE(backlog.admits(2)) << "the last may be of any size";
+    backlog.remove(1, 0);
+    for (std::size_t i = messages; i-- > 2;)
+        backlog.remove(1, 0);
+    EXPECT_EQ(calls, 1) << "once, not before half is free";
+    EXPECT_FALSE(backlog.admits(1)) << "there is too much of all";
+    EXPECT_TRUE(backlog.admits(3)) << "who has nothing waiting is let in even so";
+    backlog.remove(2, Backlog::ofAll.bytes);
+    EXPECT_EQ(calls, 2);
+    EXPECT_TRUE(backlog.admits(1));
+    EXPECT_TRUE(backlog.admits(2));
+}
+
+TEST_F(BackPressure, aReceiverThatHangsCostsItsSendersNothingButWhatTheyDrop) {
+    Listener listener(world.loop, world.server, name);
+    const auto remote = world.client.connect(name);
+    constexpr int sent = 1000; // more than are kept
+    const std::string rest(maximalInlinePayload, ' ');
+    for (int i = 0; i < sent; ++i)
+        ASSERT_EQ(Send(*remote, std::to_string(i) + rest), SendStatus::success);
+    EXPECT_EQ(logEntries("dropping messages to " + name), 1);
+
+    // Another sender is not disturbed, and nothing more than its quota was taken from the first.
+    const auto other = fork();
+    if (other == 0) {
+        RawPeer(world.directory, name).send({"", RawHeader({.payloadLength = 1}) + "x"});
+        _exit(0);
+    }
+    waitpid(other, nullptr, 0);
+    const auto quota = Backlog::ofSender.messages;
+    ASSERT_TRUE(listener.waitFor(quota + 1));
+    const auto fromOther = [&](const Arrival& arrival) { return arrival.sender.processID == other; };
+    EXPECT_EQ(std::erase_if(listener.arrivals(), fromOther), 1U);
+    EXPECT_EQ(listener.arrivals().size(), quota);
+
+    // It wakes: all that was accepted comes, in order, and the last one after it.
+    int handled = 0;
+    bool isOver = false;
+    const auto handle = [&] {
+        for (const auto& arrival : std::exchange(listener.arrivals(), {})) {
+            isOver = arrival.bytes.empty();
+            EXPECT_TRUE(isOver || NumberOf(arrival) == handled++);
+        }
+        return isOver || handled == sent;
+    };
+    ASSERT_TRUE(world.loop.runUntil([&] { return handle() || handled > sent / 4; }));
+    remote->send({}, false, {20s, 20s});
+    ASSERT_TRUE(world.loop.runUntil(handle));
+    EXPECT_TRUE(isOver);
+    EXPECT_GT(handled, 200);
+    EXPECT_LT(handled, sent);
+}
+
+TEST_F(BackPressure, aSenderHasSoManyConnectionsAndNoMore) {
+    Listener listener(world.loop, world.server, name);
+    std::vector<std::unique_ptr<RawPeer>> peers;
+    for (int i = 0; i < 16; ++i)
+        peers.push_back(std::make_unique<RawPeer>(world.directory, name));
+    for (int i = 0; i < 12; ++i)
+        EXPECT_TRUE(RawPeer(world.directory, name).isCutOff());
+    EXPECT_EQ(logEntries(": too many\n"), 10) << "a minute";
+    for (const auto& peer : peers)
+        peer->send(GoodPackets().front());
+    ASSERT_TRUE(listener.waitFor(peers.size()));
+    peers.pop_back();
+    const auto packet = GoodPackets().front().bytes;
+    EXPECT_TRUE(world.loop.runUntil([&] {
+        RawPeer(world.directory, name).trySend(packet);
+        return listener.arrivals().size() > 16;
+    })) << "once one has gone";
+}

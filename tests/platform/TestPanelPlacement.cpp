@@ -1,0 +1,66 @@
+#include "platform/linux/PanelPlacement.h"
+
+#include <gtest/gtest.h>
+
+namespace {
+
+using platform::PlacePanel;
+using platform::StatusItemFrameAt;
+
+/// The panel as it is asked for: right below the item, one point past its right edge.
+KXRect hanging(const KXRect& item, float width = 480, float height = 500) {
+    return {item.maxX() - width + 1, item.y - height, width, height};
+}
+
+TEST(PanelPlacement, MovesThePanelOnlyFromWhereThereIsNoRoom) {
+    const KXRect screen{0, 0, 1280, 800};
+    const struct {
+        const char* what;
+        KXRect item, available;
+        bool rightToLeft;
+        KXPoint placed;
+    } cases[] = {
+        {"top right, exactly as asked", {1250, 778, 30, 22}, {0, 0, 1280, 778}, false, {801, 278}},
+        {"bottom right, above the item", {1250, 0, 30, 24}, {0, 24, 1280, 776}, false, {801, 24}},
+        {"top left, with the left edges together", {100, 778, 30, 22}, {0, 0, 1280, 778}, false, {99, 278}},
+        {"side bar at the left, beside it", {0, 400, 40, 22}, {40, 0, 1240, 800}, false, {40, 0}},
+        {"side bar at the right, beside it", {1240, 700, 40, 22}, {0, 0, 1240, 800}, false, {760, 200}},
+        {"right to left, top left", {0, 778, 30, 22}, {0, 0, 1280, 778}, true, {-1, 278}},
+        {"right to left, but at the right", {1250, 778, 30, 22}, {0, 0, 1280, 778}, true, {801, 278}},
+        {"screen at the left of the main one",
+         {-30, 1000, 30, 22},
+         {-1024, 300, 1024, 722},
+         false,
+         {-479, 500}},
+        {"too low a screen, still not on the item",
+         {1250, 378, 30, 22},
+         {0, 0, 1280, 378},
+         false,
+         {801, -122}},
+    };
+    for (const auto& c : cases) {
+        const KXRect placed = PlacePanel(hanging(c.item), c.item, c.available, c.rightToLeft);
+        EXPECT_EQ(placed, (KXRect{c.placed.x, c.placed.y, 480, 500})) << c.what;
+    }
+    EXPECT_EQ(PlacePanel({5000, -900, 480, 500}, {}, screen, false), (KXRect{5000, -900, 480, 500}))
+        << "without an item there is nothing to go by";
+}
+
+TEST(PanelPlacement, GuessesTheItemsFrameFromItsClick) {
+    const KXRect screen{0, 0, 1280, 800};
+    const KXSize size{30, 22};
+    EXPECT_EQ(StatusItemFrameAt(KXPoint{1000, 790}, size, screen, {0, 0, 1280, 774}),
+              (KXRect{985, 774, 30, 26}));
+    EXPECT_EQ(StatusItemFrameAt(KXPoint{1000, 10}, size, screen, {0, 32, 1280, 768}),
+              (KXRect{985, 0, 30, 32}));
+    EXPECT_EQ(StatusItemFrameAt(KXPoint{9, 300}, size, screen, {40, 0, 1240, 800}), (KXRect{0, 289, 40, 22}));
+    EXPECT_EQ(StatusItemFrameAt(KXPoint{1270, 300}, size, screen, {0, 0, 1240, 800}),
+              (KXRect{1240, 289, 40, 22}));
+    EXPECT_EQ(StatusItemFrameAt(KXPoint{500, 300}, size, screen, screen), (KXRect{485, 289, 30, 22}))
+        << "a bar that takes no room";
+    EXPECT_EQ(StatusItemFrameAt({}, size, screen, {0, 0, 1280, 774}), (KXRect{1250, 774, 30, 26}));
+    EXPECT_EQ(StatusItemFrameAt({}, size, screen, {0, 32, 1280, 768}), (KXRect{1250, 0, 30, 32}));
+    EXPECT_EQ(StatusItemFrameAt({}, size, screen, screen), (KXRect{1250, 778, 30, 22}));
+}
+
+} // namespace

@@ -1,0 +1,43 @@
+#include "lib/plist/Binary.h"
+#include "platform/linux/PlistUserDefaults.h"
+#include "tests/support/ScratchHome.h"
+
+#include <algorithm>
+#include <gtest/gtest.h>
+
+namespace {
+
+TEST(UserDefaults, FollowTheirFileAndLogABrokenOneOnce) {
+    const ScratchHome home;
+    const platform::PlistUserDefaults defaults;
+    const auto file = home.path() / "Library/Preferences/.GlobalPreferences.plist";
+    std::filesystem::create_directories(file.parent_path());
+    auto write = [&file, writes = 0](std::string_view contents) mutable {
+        std::ofstream(file, std::ios::binary) << contents;
+        // Two writes within one tick of the file system must still look like two.
+        std::filesystem::last_write_time(file, std::filesystem::file_time_type(std::chrono::hours(++writes)));
+    };
+    const auto variant = [&] { return defaults.integerForKey("AppleAquaColorVariant"); };
+    const auto logLines = [] { return std::ranges::count(ScratchHome::log(), '\n'); };
+    std::string error;
+    const auto bytes =
+        plist::WriteBinary(plist::Dictionary{{"AppleAquaColorVariant", 6}, {"x", "6"}}, error).joined();
+    const std::string_view settings(reinterpret_cast<const char*>(bytes.data()), bytes.size());
+
+    EXPECT_EQ(variant(), 0);
+    write(settings);
+    EXPECT_EQ(variant(), 6);
+    EXPECT_EQ(defaults.integerForKey("x") + defaults.integerForKey("absent"), 0);
+    std::filesystem::remove(file);
+    EXPECT_EQ(variant(), 0);
+    EXPECT_EQ(logLines(), 0) << "a missing file is nothing to report";
+    for (const int problems : {1, 2}) {
+        write("broken");
+        EXPECT_EQ(variant() + variant(), 0);
+        EXPECT_EQ(logLines(), problems);
+    }
+    write(settings);
+    EXPECT_EQ(variant(), 6);
+}
+
+} // namespace

@@ -1,0 +1,94 @@
+#include "platform/linux/UnixPortWatches.h"
+
+#include "lib/plist/Binary.h"
+#include "tests/platform/PortWorlds.h"
+
+#include <gmock/gmock.h>
+
+using namespace platform;
+
+namespace {
+
+struct Watcher final : PortWatchDelegate {
+    void onStatistics(const SharedBytes& propertyList) override {
+        std::string error;
+        statistics = plist::Parse(propertyList, error);
+    }
+    void onMessage(const PassingMessage& message) override {
+        messages.push_back(message);
+        lost += message.missed;
+    }
+    void onEnd() override { ended = true; }
+
+    plist::Value statistics;
+    std::vector<PassingMessage> messages;
+    std::uint64_t lost = 0;
+    bool ended = false;
+};
+
+struct PortWatchesTest : testing::Test {
+    static void answer(Arrival& arrival) { arrival.receipt.reset(); }
+
+    UnixWorld world;
+    UnixPortWatches watches{world.loop, world.directory};
+    Watcher watcher;
+};
+
+TEST_F(PortWatchesTest, TellOfWhatComesAndGoesUntilTheEnd) {
+    EXPECT_FALSE(watches.watch("a", watcher));
+    Listener a(world.loop, world.server, "a", answer), b(world.loop, world.client, "b");
+    const auto toA = world.client.connect("a");
+    ASSERT_EQ(Send(*toA, "before"), SendStatus::success);
+    const auto watch = watches.watch("a", watcher);
+    ASSERT_TRUE(world.loop.runUntil([&] { return watcher.statistics.size() > 0; }));
+    EXPECT_EQ(watcher.statistics["connections"].intValue(), 1);
+    EXPECT_EQ(watcher.statistics["received"].intValue(), 1);
+    EXPECT_EQ(watcher.statistics["sent"].intValue(), 0);
+
+    const std::string large(300'000, 'x');
+    Send(*toA, "question", true);
+    const auto toB = world.server.connect("b");
+    Send(*toB, large);
+    Send(*toB, "");
+    ASSERT_TRUE(
+        world.loop.runUntil([&] { return watcher.messages.size() == 3 && a.arrivals().size() == 2; }));
+    std::vector<std::string> seen;
+    for (const auto& message : watcher.messages) {
+        EXPECT_EQ(message.processID, getpid());
+        seen.push_back((message.outgoing ? "out " : "in ") +
+                       std::string(reinterpret_cast<const char*>(message.bytes.data()),
+                                   std::min<std::size_t>(message.bytes.size(), 8)) +
+                       (message.synchronous ? " waits" : ""));
+    }
+    EXPECT_THAT(seen, testing::ElementsAre("in question waits", "out xxxxxxxx", "out "));
+    EXPECT_EQ(watcher.messages[1].bytes.size(), large.size());
+    EXPECT_EQ(watcher.lost, 0U);
+    a.close();
+    EXPECT_TRUE(world.loop.runUntil([&] { return watcher.ended; }));
+}
+
+TEST_F(PortWatchesTest, NeverMakeTheWatchedWaitAndKnowWhatTheyMissed) {
+    Listener a(world.loop, world.server, "a", answer);
+    const auto toA = world.client.connect("a");
+    auto watch = watches.watch("a", watcher);
+    ASSERT_TRUE(world.loop.runUntil([&] { return watcher.statistics.size() > 0; }));
+    constexpr std::size_t count = 500;
+    for (std::size_t i = 0; i < count; ++i) // without a turn of the watcher's loop
+        ASSERT_EQ(Send(*toA, std::string(5'000, 'x'), true), SendStatus::success);
+    Send(*toA, "last");
+    ASSERT_TRUE(a.waitFor(count + 1));
+    world.loop.runPending();
+    Send(*toA, "after");
+    ASSERT_TRUE(
+        world.loop.runUntil([&] { return watcher.lost > 0 && watcher.messages.back().bytes.size() == 5; }));
+    EXPECT_EQ(watcher.messages.size() + watcher.lost, count + 2);
+
+    watch.reset();
+    Watcher second;
+    Send(*toA, "x", true);
+    watch = watches.watch("a", second);
+    ASSERT_TRUE(world.loop.runUntil([&] { return second.statistics.size() > 0; }));
+    EXPECT_EQ(second.statistics["connections"].intValue(), 1) << "the first watcher's has gone";
+}
+
+} // namespace

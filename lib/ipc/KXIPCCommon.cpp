@@ -1,0 +1,129 @@
+#include "lib/ipc/KXIPCCommon.h"
+
+#include "lib/base/Log.h"
+#include "lib/ipc/KXIPCContext.h"
+#include "lib/ipc/KXIPCMessage.h"
+#include "lib/ipc/KXIPCObserverEntry.h"
+#include "lib/kxAppKit/system/KXProcess.h"
+#include "lib/plist/Value.h"
+
+#include <algorithm>
+#include <chrono>
+#include <cstddef>
+#include <cstdint>
+#include <functional>
+#include <utility>
+#include <vector>
+
+KXIPCCommon::KXIPCCommon(KXIPCContext& context)
+    : m_context(context)
+    , m_messageReceiver(context, *this) {}
+
+KXIPCCommon::~KXIPCCommon() = default;
+
+void KXIPCCommon::setAllowIncomingMessages(bool allow) {
+    if (allow)
+        m_messageReceiver.startReceivingWithPortName(portName());
+    else
+        m_messageReceiver.stopReceiving();
+}
+
+KXIPCCommon::Observer* KXIPCCommon::find(const void* token) {
+    const auto found = std::ranges::find(m_observerTable, token, &Observer::token);
+    return found == m_observerTable.end() ? nullptr : &*found;
+}
+
+void KXIPCCommon::addEntries(const KXIPCObserverEntry::Array& entries, const void* observer) {
+    auto* known = find(observer);
+    if (!known) known = &m_observerTable.emplace_back(Observer{observer, {}});
+    known->entries.insert(known->entries.end(), entries.begin(), entries.end());
+}
+
+void KXIPCCommon::removeEntries(const KXIPCObserverEntry::Array& entries, const void* observer) {
+    auto* known = find(observer);
+    if (!known) return;
+    // Removing each entry's matches at once would shift the indexes of the next; the empty list stays.
+    std::vector<bool> removed(known->entries.size());
+    for (const auto& entry : entries)
+        for (const auto index : entry->matchesInObserverArray(known->entries))
+            removed[index] = true;
+    std::size_t index = 0;
+    std::erase_if(known->entries, [&](const auto&) { return removed[index++]; });
+    ++m_removals;
+}
+
+KXIPCObserverEntry::Array KXIPCCommon::allEntries() const {
+    KXIPCObserverEntry::Array all;
+    for (const auto& observer : m_observerTable)
+        all.insert(all.end(), observer.entries.begin(), observer.entries.end());
+    return all;
+}
+
+std::uint64_t KXIPCCommon::processNumber() const {
+    return KXNumberFromProcessSerialNumber(
+        m_context.processes.currentProcess().value_or(ProcessSerialNumber{}));
+}
+
+void KXIPCCommon::postMessage(const KXIPCMessage& message, bool) {
+    dispatchMessageToLocalListeners(message);
+}
+
+void KXIPCCommon::dispatchMessageToLocalListeners(const KXIPCMessage& message) {
+    std::vector<const void*> tokens;
+    tokens.reserve(m_observerTable.size());
+    for (const auto& observer : m_observerTable)
+        tokens.push_back(observer.token);
+    for (const auto* token : tokens)
+        dispatch(message, token);
+}
+
+void KXIPCCommon::dispatch(const KXIPCMessage& message, const void* token) {
+    const auto* observer = find(token);
+    if (!observer) return;
+    KXIPCObserverEntry::Array matching;
+    for (const auto index : message.matchesInObserverArray(observer->entries))
+        matching.push_back(observer->entries[index]);
+
+    const auto removalsBefore = m_removals;
+    const auto isStillThere = [&](const KXIPCObserverEntry::Pointer& entry) {
+        if (m_removals == removalsBefore) return true;
+        const auto* now = find(token);
+        return now && std::ranges::find(now->entries, entry) != now->entries.end();
+    };
+    for (const auto& entry : matching)
+        if (entry->selector() && isStillThere(entry))
+            entry->selector()({*message.name(), message.object(), message.userInfo()});
+}
+
+void KXIPCCommon::onRemoteMessageReceived(const plist::Value& envelope) {
+    if (!allowIncomingMessages()) return;
+    const auto message = KXIPCMessage::initWithInfo(envelope["message"]);
+    const auto sender = envelope["psnKey"].unsignedLongLongValue();
+    const auto messageID = envelope["messageID"].intValue();
+    auto& lastMessageID = m_lastMessageIDs[sender];
+    if (messageID > lastMessageID) {
+        lastMessageID = messageID;
+        dispatchMessageToLocalListeners(message);
+        return;
+    }
+    const auto processID = static_cast<int>(KXProcessSerialNumberFromNumber(sender).lowLongOfPSN);
+    if (m_logLimit.allows(processID, std::chrono::steady_clock::now()))
+        Log("IPC: %s: dropping duplicate or out of order message\n",
+            "-[KXIPCCommon onRemoteMessageReceived:]");
+}
+
+void KXIPCCommon::terminateWithDelegate(std::function<void()> selector) {
+    m_terminateSelector = std::move(selector);
+    m_observerTable.clear();
+    ++m_removals;
+    // A port that could not be opened has had its end notice, and no other will come.
+    const bool isNoticeToCome = m_messageReceiver.willTerminate();
+    if (allowIncomingMessages()) setAllowIncomingMessages(false);
+    if (!isNoticeToCome) onMessageReceiverDidTerminate();
+}
+
+void KXIPCCommon::onMessageReceiverDidTerminate() {
+    // Moved out first: the selector may destroy this object.
+    const auto selector = std::exchange(m_terminateSelector, nullptr);
+    if (selector) selector();
+}

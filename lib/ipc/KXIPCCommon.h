@@ -1,0 +1,71 @@
+#pragma once
+
+#include "lib/base/LogLimit.h"
+#include "lib/ipc/KXIPCContext.h"
+#include "lib/ipc/KXIPCMessage.h"
+#include "lib/ipc/KXIPCMessageReceiver.h"
+#include "lib/ipc/KXIPCObserverEntry.h"
+
+#include <cstdint>
+#include <functional>
+#include <string>
+#include <unordered_map>
+#include <utility>
+#include <vector>
+
+/// What client and server share: the local observers, the receiver, and the dispatch of what arrives.
+/// Main thread only. Observers are tokens, never dereferenced: remove an observer's entries before it goes
+/// away. Only the selector of `terminateWithDelegate` may destroy the object that calls it.
+class KXIPCCommon : public KXIPCMessageReceiverDelegate {
+public:
+    explicit KXIPCCommon(KXIPCContext& context);
+    ~KXIPCCommon() override;
+    KXIPCCommon(const KXIPCCommon&) = delete;
+    KXIPCCommon& operator=(const KXIPCCommon&) = delete;
+
+    virtual std::string portName() const { return {}; }
+    bool allowIncomingMessages() const { return m_messageReceiver.messageReceiverThread(); }
+    virtual void setAllowIncomingMessages(bool allow);
+    /// Whether messages can reach us: they cannot, though allowed, when another process has the name.
+    bool isReachable() const { return m_messageReceiver.isPortOpen(); }
+
+    /// An entry added twice is called twice. Entries may be added and removed while a message is dispatched;
+    /// one that was removed is not called.
+    virtual void addEntries(const KXIPCObserverEntry::Array& entries, const void* observer);
+    /// Removes all that the given entries stand for, not only the entries themselves.
+    virtual void removeEntries(const KXIPCObserverEntry::Array& entries, const void* observer);
+
+    /// Calls the local observers before it returns; client and server then send.
+    virtual void postMessage(const KXIPCMessage& message, bool synchronously);
+
+    /// Forgets all observers, ends receiving, and calls `selector` once that is done: at once when nothing
+    /// was being received.
+    virtual void terminateWithDelegate(std::function<void()> selector);
+
+    void onRemoteMessageReceived(const plist::Value& envelope) override;
+    void onMessageReceiverDidTerminate() override;
+
+protected:
+    KXIPCContext& context() const { return m_context; }
+    /// The entries of all observers, in the order in which observers came.
+    KXIPCObserverEntry::Array allEntries() const;
+    /// This process in the form in which it travels.
+    std::uint64_t processNumber() const;
+
+private:
+    struct Observer {
+        const void* token;
+        KXIPCObserverEntry::Array entries;
+    };
+    Observer* find(const void* token);
+    void dispatchMessageToLocalListeners(const KXIPCMessage& message);
+    void dispatch(const KXIPCMessage& message, const void* token);
+
+    KXIPCContext& m_context;
+    std::vector<Observer> m_observerTable;
+    std::uint64_t m_removals = 0; ///< tells a dispatch under way whether to look again before it calls
+    std::unordered_map<std::uint64_t, std::int32_t> m_lastMessageIDs; ///< by sender
+    LogLimit m_logLimit;
+    std::function<void()> m_terminateSelector;
+    KXIPCMessageReceiver m_messageReceiver;
+};

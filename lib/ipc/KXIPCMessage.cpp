@@ -1,0 +1,48 @@
+#include "lib/ipc/KXIPCMessage.h"
+
+#include "lib/base/IsEqual.h"
+#include "lib/ipc/KXIPCObserverEntry.h"
+#include "lib/plist/Value.h"
+
+#include <cstddef>
+#include <optional>
+#include <string>
+#include <utility>
+#include <vector>
+
+KXIPCMessage::KXIPCMessage(std::optional<std::string> name, std::optional<std::string> object,
+                           plist::Value userInfo)
+    : m_name(std::move(name))
+    , m_object(std::move(object))
+    , m_userInfo(userInfo.isDictionary() ? std::move(userInfo) : plist::Value()) {}
+
+KXIPCMessage KXIPCMessage::initWithInfo(const plist::Value& info) {
+    return {info["name"].string(), info["object"].string(), info["userInfo"]};
+}
+
+plist::Value KXIPCMessage::propertyList() const {
+    plist::Dictionary list;
+    if (m_name) list.set("name", *m_name);
+    if (m_object) list.set("object", *m_object);
+    return list.set("userInfo", m_userInfo);
+}
+
+std::vector<std::size_t>
+KXIPCMessage::matchesInObserverArray(const KXIPCObserverEntry::Array& entries) const {
+    std::vector<std::size_t> matches;
+    for (std::size_t index = 0; index < entries.size(); ++index) {
+        const auto& entry = *entries[index];
+        const bool objectMatches = !entry.object() || KXIsEqual(entry.object(), m_object);
+        if (KXIsEqual(m_name, entry.name()) && objectMatches) matches.push_back(index);
+    }
+    return matches;
+}
+
+std::string KXIPCMessage::description() const {
+    std::string text = "\t\t name: " + m_name.value_or("(null)") + "\n";
+    // A separator between lines that end in one looks wrong; the blank lines are how this has always read.
+    text += "\n\t\t object: " + m_object.value_or("(null)") + "\n";
+    for (std::size_t index = 0; index < m_userInfo.size(); ++index)
+        text += "\n\t\t info." + m_userInfo.keyAt(index) + ": " + m_userInfo.at(index).description() + "\n";
+    return text;
+}

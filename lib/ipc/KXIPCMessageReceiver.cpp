@@ -1,0 +1,160 @@
+#include "lib/ipc/KXIPCMessageReceiver.h"
+
+#include "lib/base/Log.h"
+#include "lib/base/LogLimit.h"
+#include "lib/ipc/KXIPCEnvelope.h"
+#include "lib/plist/Binary.h"
+#include "lib/plist/Value.h"
+#include "platform/MessagePort.h"
+
+#include <chrono>
+#include <deque>
+#include <memory>
+#include <mutex>
+#include <optional>
+#include <string>
+#include <system_error>
+#include <thread>
+#include <utility>
+#include <vector>
+
+/// One port from start to end notice. What arrived waits in an inbox here, and each task posted to the main
+/// loop takes one thing out: so all of it goes when the worker goes, whatever is still posted.
+class KXIPCMessageReceiver::Worker : public std::enable_shared_from_this<Worker> {
+public:
+    explicit Worker(KXIPCMessageReceiver& receiver)
+        : m_receiver(receiver)
+        , m_mainLoop(receiver.m_context.mainLoop) {}
+
+    void start(std::unique_ptr<platform::LocalPort> port) {
+        m_port = std::move(port);
+        if (m_port && startThread()) return;
+        m_port.reset();
+        Log("%s, listening for messages failed\n", "-[KXIPCMessageReceiver workerThreadStartReceiving:]");
+        forward({});
+    }
+
+    void close() {
+        if (m_port) m_port->close();
+    }
+
+    /// Nothing is delivered any more. A handler further up the stack may still hold this worker.
+    void withdraw() {
+        close();
+        join();
+        m_inbox.clear();
+    }
+
+    bool hasPort() const { return m_port != nullptr; }
+    bool hasTerminated() const { return m_hasTerminated; }
+
+private:
+    struct Delivery {
+        plist::Value envelope; ///< nil: the end
+        std::unique_ptr<platform::Receipt> receipt;
+    };
+
+    bool startThread() {
+        try {
+            m_thread = std::thread([this] { workerThreadStartReceiving(); });
+        } catch (const std::system_error&) { // the system has no more threads for us
+            return false;
+        }
+        return true;
+    }
+
+    void workerThreadStartReceiving() {
+        m_port->run([this](platform::Arrival arrival) { WorkerThreadOnMessageReceived(std::move(arrival)); });
+        forward({});
+    }
+
+    void WorkerThreadOnMessageReceived(platform::Arrival arrival) {
+        constexpr auto routine = "WorkerThreadOnMessageReceived";
+        std::string error;
+        auto envelope = plist::Parse(arrival.bytes, error);
+        if (error.empty()) error = KXIPCEnvelopeError(envelope);
+        if (error.empty() && KXIPCEnvelopeIsFrom(envelope, arrival.sender)) {
+            forward({std::move(envelope), std::move(arrival.receipt)});
+            return;
+        }
+        if (!m_logLimit.allows(arrival.sender.processID, std::chrono::steady_clock::now())) return;
+        if (error.empty())
+            Log("IPC: %s: dropping message that process %d sent in another's name\n", routine,
+                arrival.sender.processID);
+        else
+            Log("IPC: %s: unable to parse remote message. Error: %s\n", routine, error.c_str());
+    }
+
+    void forward(Delivery delivery) {
+        {
+            const std::lock_guard lock(m_mutex);
+            m_inbox.push_back(std::move(delivery));
+        }
+        m_mainLoop.post([weak = weak_from_this()] {
+            if (const auto worker = weak.lock()) worker->deliver();
+        });
+    }
+
+    std::optional<Delivery> takeDelivery() {
+        const std::lock_guard lock(m_mutex);
+        if (m_inbox.empty()) return std::nullopt;
+        auto delivery = std::move(m_inbox.front());
+        m_inbox.pop_front();
+        return delivery;
+    }
+
+    void deliver() {
+        const auto delivery = takeDelivery();
+        if (!delivery) return;
+        auto& delegate = m_receiver.m_delegate;
+        if (!delivery->envelope.isNil()) return delegate.onRemoteMessageReceived(delivery->envelope);
+        join();
+        m_hasTerminated = true;
+        std::erase(m_receiver.m_stoppingThreads, shared_from_this());
+        delegate.onMessageReceiverDidTerminate();
+    }
+
+    void join() {
+        if (m_thread.joinable()) m_thread.join();
+    }
+
+    KXIPCMessageReceiver& m_receiver;
+    platform::MainLoop& m_mainLoop;
+    std::unique_ptr<platform::LocalPort> m_port;
+    std::thread m_thread;
+    LogLimit m_logLimit;
+    std::mutex m_mutex;
+    std::deque<Delivery> m_inbox;
+    bool m_hasTerminated = false;
+};
+
+KXIPCMessageReceiver::KXIPCMessageReceiver(KXIPCContext& context, KXIPCMessageReceiverDelegate& delegate)
+    : m_context(context)
+    , m_delegate(delegate) {}
+
+KXIPCMessageReceiver::~KXIPCMessageReceiver() {
+    if (m_messageReceiverThread) m_messageReceiverThread->withdraw();
+    for (const auto& worker : m_stoppingThreads)
+        worker->withdraw();
+}
+
+void KXIPCMessageReceiver::startReceivingWithPortName(const std::string& portName) {
+    if (m_messageReceiverThread) return;
+    m_messageReceiverThread = std::make_shared<Worker>(*this);
+    m_messageReceiverThread->start(m_context.ports.open(portName));
+}
+
+void KXIPCMessageReceiver::stopReceiving() {
+    if (!m_messageReceiverThread) return;
+    m_messageReceiverThread->close();
+    if (willTerminate()) m_stoppingThreads.push_back(m_messageReceiverThread);
+    m_messageReceiverThread.reset();
+}
+
+bool KXIPCMessageReceiver::isPortOpen() const {
+    return m_messageReceiverThread && m_messageReceiverThread->hasPort();
+}
+
+bool KXIPCMessageReceiver::willTerminate() const {
+    return m_messageReceiverThread && !m_messageReceiverThread->hasTerminated();
+}

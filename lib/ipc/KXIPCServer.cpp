@@ -1,0 +1,112 @@
+#include "lib/ipc/KXIPCServer.h"
+
+#include "lib/base/KXNotificationCenter.h"
+#include "lib/ipc/KXIPCCommon.h"
+#include "lib/ipc/KXIPCContext.h"
+#include "lib/ipc/KXIPCMessage.h"
+#include "lib/ipc/KXIPCNames.h"
+#include "lib/ipc/KXIPCObserverEntry.h"
+#include "lib/ipc/KXIPCSend.h"
+#include "lib/kxAppKit/system/KXProcess.h"
+#include "lib/plist/Value.h"
+#include "platform/DistributedNotificationCenter.h"
+
+#include <cstdint>
+#include <functional>
+#include <iterator>
+#include <optional>
+#include <string>
+#include <utility>
+#include <vector>
+
+namespace {
+
+std::optional<std::uint64_t> clientNumber(const KXNotification& notification) {
+    const auto number = KXUserInfo(notification)[KX_IPC_PARAM_PSN];
+    if (number.type() != plist::Type::integer) return std::nullopt;
+    return number.unsignedLongLongValue();
+}
+
+} // namespace
+
+KXIPCServer::KXIPCServer(KXIPCContext& context)
+    : KXIPCCommon(context) {
+    const KXIPCObserverEntryRow rows[] = {
+        {KX_IPC_ADD_LISTENER_NOTIFICATION,
+         [this](const auto& notification) { onAddListener(notification); },
+         {}},
+        {KX_IPC_REMOVE_LISTENER_NOTIFICATION,
+         [this](const auto& notification) { onRemoveListener(notification); },
+         {}},
+    };
+    KXIPCCommon::addEntries(KXIPCObserverEntryArray(rows, std::size(rows)), this);
+}
+
+std::string KXIPCServer::portName() const {
+    return KX_IPC_ServerPortName();
+}
+
+void KXIPCServer::setAllowIncomingMessages(bool allow) {
+    KXIPCCommon::setAllowIncomingMessages(allow);
+    context().notifications.post(allowIncomingMessages() ? KX_IPC_SERVER_DID_LAUNCH_NOTIFICATION
+                                                         : KX_IPC_SERVER_DID_TERMINATE_NOTIFICATION);
+}
+
+void KXIPCServer::postMessage(const KXIPCMessage& message, bool synchronously) {
+    KXIPCCommon::postMessage(message, synchronously);
+    for (const auto& client : clientsForMessage(message))
+        KX_IPC_SendMessageToNamedPort(context(), message, KX_IPC_PortNameForProcess(client.get()),
+                                      synchronously);
+}
+
+std::vector<KXProcess::Pointer> KXIPCServer::clientsForMessage(const KXIPCMessage& message) const {
+    std::vector<KXProcess::Pointer> clients;
+    for (const auto& [number, client] : m_clients)
+        if (!message.matchesInObserverArray(client.entries).empty()) clients.push_back(client.process);
+    return clients;
+}
+
+void KXIPCServer::terminateWithDelegate(std::function<void()> selector) {
+    m_clients.clear();
+    KXIPCCommon::terminateWithDelegate(std::move(selector));
+}
+
+void KXIPCServer::onAddListener(const KXNotification& notification) {
+    const auto number = clientNumber(notification);
+    const auto added = KXIPCObserverEntry::observerEntryTableFromNotification(notification);
+    if (!number || !added) return;
+
+    auto& client = m_clients[*number];
+    client.entries.insert(client.entries.end(), added->begin(), added->end());
+    if (client.process) return;
+
+    client.process =
+        KXProcess::processWithSerialNumber(context().processes, KXProcessSerialNumberFromNumber(*number));
+    client.process->addObserverForProcessDeath(this, [this](KXProcess& process) {
+        removeClient(KXNumberFromProcessSerialNumber(process.processSerialNumber()));
+    });
+    confirm(*client.process);
+    // Its death came before the watch, so nothing will tell of it.
+    if (!client.process->isValid()) removeClient(*number);
+}
+
+void KXIPCServer::confirm(const KXProcess& client) {
+    const KXIPCMessage message(KX_IPC_CONNECTED_TO_SERVER_NOTIFICATION, context().mainBundleIdentifier,
+                               plist::Dictionary{{KX_IPC_PARAM_PSN, processNumber()}});
+    KX_IPC_SendMessageToNamedPort(context(), message, KX_IPC_PortNameForProcess(&client), false);
+}
+
+void KXIPCServer::onRemoveListener(const KXNotification& notification) {
+    const auto number = clientNumber(notification);
+    if (!number) return;
+    if (KXUserInfo(notification)[KX_IPC_PARAM_ALL_MESSAGES].boolValue()) return removeClient(*number);
+    if (!KXIPCObserverEntry::observerEntryTableFromNotification(notification)) return;
+    // Removing the entries of that table looks right. They are compared by identity, and entries just read
+    // from a message are never the stored ones: none ever leaves this way.
+    const auto client = m_clients.find(*number);
+    if (client != m_clients.end() && client->second.entries.empty()) removeClient(*number);
+}
+
+void KXIPCServer::removeClient(std::uint64_t number) {
+    m_clients.erase(number);
+}

@@ -1,0 +1,37 @@
+#pragma once
+
+#include "lib/ipc/KXIPCCommon.h"
+#include "lib/kxAppKit/system/KXProcess.h"
+
+#include <cstdint>
+#include <map>
+#include <vector>
+
+/// The server's end: knows which client wants which messages, and sends each message to those alone. One per
+/// user's session. Receives nothing until `setAllowIncomingMessages(true)`.
+class KXIPCServer : public KXIPCCommon {
+public:
+    explicit KXIPCServer(KXIPCContext& context);
+
+    std::string portName() const override;
+    /// Broadcasts on every call whether the server is there now.
+    void setAllowIncomingMessages(bool allow) override;
+    /// Synchronously: waits for each client before the next is sent to.
+    void postMessage(const KXIPCMessage& message, bool synchronously) override;
+    void terminateWithDelegate(std::function<void()> selector) override;
+
+    /// The clients with an entry that the message matches, each once.
+    std::vector<KXProcess::Pointer> clientsForMessage(const KXIPCMessage& message) const;
+
+private:
+    struct Client {
+        KXIPCObserverEntry::Array entries;
+        KXProcess::Pointer process;
+    };
+    void onAddListener(const KXNotification& notification);
+    void onRemoveListener(const KXNotification& notification);
+    void removeClient(std::uint64_t number);
+    void confirm(const KXProcess& client);
+
+    std::map<std::uint64_t, Client> m_clients; ///< by serial number
+};

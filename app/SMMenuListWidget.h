@@ -1,0 +1,43 @@
+#pragma once
+
+#include "app/SMMenuCollectionView.h"
+#include "app/SMMenuHostWidget.h"
+
+#include <QPixmap>
+
+/// Shows a list; paints its visible rows.
+class SMMenuListWidget final : public SMMenuHostWidget, private SMMenuCollectionView::Host {
+public:
+    explicit SMMenuListWidget(QWidget* parent = nullptr);
+    ~SMMenuListWidget() override { setList(nullptr); }
+    SMMenuListWidget(const SMMenuListWidget&) = delete;
+    SMMenuListWidget& operator=(const SMMenuListWidget&) = delete;
+
+    /// Borrowed; null for none. The list takes the widget's size.
+    void setList(SMMenuCollectionView* list);
+    void fitList();
+    SMMenuCollectionView* list() const { return m_list; }
+    /// In the widget.
+    QRectF placeOf(const SMMenuButton& row) const { return fromUpwards(row.frame()); }
+    /// Slides from the list shown to another, which comes in from where text ends when `forward`. Returns
+    /// when it is there; no event is handled meanwhile.
+    void slideTo(SMMenuCollectionView* list, bool forward, const platform::Clock& clock);
+
+protected:
+    void paintEvent(QPaintEvent* event) override;
+
+private:
+    void setNeedsDisplay(const KXRect& area) override { update(fromUpwards(area).toAlignedRect()); }
+
+    struct Slide {
+        QPixmap before;
+        QPixmap after;
+        double beforeX;
+        double afterX;
+    };
+    QPixmap picture() const;
+    void drawRows(QPainter& painter, const QRectF& dirty) const;
+
+    SMMenuCollectionView* m_list = nullptr;
+    const Slide* m_slide = nullptr; ///< while one is under way
+};

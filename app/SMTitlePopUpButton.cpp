@@ -1,0 +1,58 @@
+#include "app/SMTitlePopUpButton.h"
+
+#include "app/menuMirroring.h"
+#include "lib/base/Geometry.h"
+#include "lib/kxAppKit/KXBezierPath.h"
+
+#include <QFontMetricsF>
+#include <QPainter>
+#include <QWheelEvent>
+#include <algorithm>
+#include <cmath>
+
+namespace {
+
+constexpr float titleInset = 14;
+constexpr double titleRoom = 40;
+constexpr float arrowGap = 7;
+constexpr KXSize arrowSize{8, 6};
+
+} // namespace
+
+SMTitlePopUpButton::SMTitlePopUpButton(QWidget* parent)
+    : QComboBox(parent) {
+    setFocusPolicy(Qt::NoFocus);
+}
+
+void SMTitlePopUpButton::paintEvent(QPaintEvent*) {
+    QFont titleFont = font();
+    titleFont.setBold(true);
+    titleFont.setPixelSize(12);
+    const QFontMetricsF metrics(titleFont);
+    const QString title = currentText();
+    const double titleHeight = std::ceil(metrics.height());
+    const double titleWidth = std::min(std::ceil(metrics.horizontalAdvance(title)), width() - titleRoom);
+    KXRect titleRect{titleInset, static_cast<float>(std::round((height() - titleHeight) * 0.5) - 1),
+                     static_cast<float>(titleWidth), static_cast<float>(titleHeight)};
+    KXRect arrow{titleRect.maxX() + arrowGap,
+                 std::round((static_cast<float>(height()) - arrowSize.height) * 0.5F), arrowSize.width,
+                 arrowSize.height};
+    if (menuIsMirrored()) {
+        titleRect = menuMirrored(titleRect, static_cast<float>(width()));
+        arrow = menuMirrored(arrow, static_cast<float>(width()));
+    }
+
+    QPainter painter(this);
+    painter.setFont(titleFont);
+    painter.setPen(Qt::white);
+    painter.drawText(QRectF(titleRect.x, titleRect.y, titleRect.width, titleRect.height),
+                     Qt::AlignLeft | Qt::TextSingleLine,
+                     metrics.elidedText(title, Qt::ElideMiddle, titleWidth));
+    painter.setRenderHint(QPainter::Antialiasing);
+    // "Up" is not the wrong way round: y grows downwards here, so the arrow points down.
+    KXBezierPath::arrowInRect(arrow, KXArrowDirectionUp).fill(painter, Qt::white);
+}
+
+void SMTitlePopUpButton::wheelEvent(QWheelEvent* event) {
+    event->ignore();
+}

@@ -1,0 +1,115 @@
+#include "app/menuBackground.h"
+
+#include <algorithm>
+#include <array>
+#include <cmath>
+#include <vector>
+
+namespace {
+
+/// Half of the 8 points, less what halving the picture and enlarging it again blur by themselves.
+constexpr double halfSizeSigma = 3.97;
+
+struct Pixel {
+    std::array<float, 4> channels{};
+
+    Pixel& operator+=(const Pixel& other) {
+        for (std::size_t i = 0; i < 4; ++i)
+            channels[i] += other.channels[i];
+        return *this;
+    }
+    Pixel& operator-=(const Pixel& other) {
+        for (std::size_t i = 0; i < 4; ++i)
+            channels[i] -= other.channels[i];
+        return *this;
+    }
+};
+
+Pixel toPixel(QRgb rgb) {
+    return {{static_cast<float>(qBlue(rgb)), static_cast<float>(qGreen(rgb)), static_cast<float>(qRed(rgb)),
+             255}};
+}
+
+QRgb toRgb(const Pixel& pixel) {
+    const auto level = [&](std::size_t i) { return static_cast<int>(pixel.channels[i] + 0.5F); };
+    return qRgb(level(2), level(1), level(0));
+}
+
+/// A moving average whose outermost pixels count for less than the others, so that it has any variance.
+struct Box {
+    std::size_t radius; ///< of those that count fully
+    float outer;        ///< weight of the one beyond, on either side
+    float scale;
+
+    explicit Box(double variance) {
+        const double r = std::floor((std::sqrt(12 * variance + 1) - 1) / 2);
+        const double full = 2 * r + 1;
+        const double weight = full * (variance - r * (r + 1) / 3) / (2 * ((r + 1) * (r + 1) - variance));
+        radius = static_cast<std::size_t>(r);
+        outer = static_cast<float>(weight);
+        scale = static_cast<float>(1 / (full + 2 * weight));
+    }
+    /// What a line loses at either end.
+    std::size_t reach() const { return radius + 1; }
+
+    void average(const std::vector<Pixel>& in, std::vector<Pixel>& out) const {
+        out.resize(in.size() - 2 * reach());
+        Pixel sum;
+        for (std::size_t i = 1; i < 2 * reach(); ++i)
+            sum += in[i];
+        for (std::size_t i = 0; i < out.size(); ++i) {
+            const Pixel& before = in[i];
+            const Pixel& after = in[i + 2 * reach()];
+            for (std::size_t k = 0; k < 4; ++k)
+                out[i].channels[k] =
+                    scale * (sum.channels[k] + outer * (before.channels[k] + after.channels[k]));
+            sum += after;
+            sum -= in[i + 1];
+        }
+    }
+};
+
+constexpr int passes = 3;
+
+/// Blurs the rows and makes columns of them.
+QImage blurredAndTransposed(const QImage& image, const Box& box) {
+    const auto width = static_cast<std::size_t>(image.width());
+    const std::size_t padding = passes * box.reach();
+    QImage result(image.height(), image.width(), QImage::Format_RGB32);
+    auto* pixels = reinterpret_cast<QRgb*>(result.bits());
+    const auto stride = static_cast<std::size_t>(result.bytesPerLine()) / sizeof(QRgb);
+    std::vector<Pixel> line;
+    std::vector<Pixel> next;
+    for (int y = 0; y < image.height(); ++y) {
+        const auto* row = reinterpret_cast<const QRgb*>(image.constScanLine(y));
+        line.assign(padding, toPixel(row[0]));
+        line.reserve(width + 2 * padding);
+        std::transform(row, row + width, std::back_inserter(line), toPixel);
+        line.resize(width + 2 * padding, toPixel(row[width - 1]));
+        for (int pass = 0; pass < passes; ++pass) {
+            box.average(line, next);
+            line.swap(next);
+        }
+        for (std::size_t x = 0; x < width; ++x)
+            pixels[x * stride + static_cast<std::size_t>(y)] = toRgb(line[x]);
+    }
+    return result;
+}
+
+} // namespace
+
+QImage blurredImage(const QImage& image, double sigma) {
+    if (image.isNull()) return {};
+    const Box box(sigma * sigma / passes);
+    return blurredAndTransposed(blurredAndTransposed(image.convertToFormat(QImage::Format_RGB32), box), box);
+}
+
+QImage menuBackground(const QImage& screen) {
+    if (screen.width() < 2) return {};
+    const QSizeF half = screen.deviceIndependentSize() / 2;
+    QImage small =
+        screen.convertToFormat(QImage::Format_RGB32)
+            .scaled(half.toSize().expandedTo({1, 1}), Qt::IgnoreAspectRatio, Qt::SmoothTransformation);
+    small.setDevicePixelRatio(1);
+    return blurredImage(small, halfSizeSigma);
+}

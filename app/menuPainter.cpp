@@ -1,0 +1,161 @@
+#include "app/menuPainter.h"
+
+#include "lib/base/Geometry.h"
+#include "lib/kxAppKit/KXBezierPath.h"
+#include "lib/kxAppKit/KXImage.h"
+#include "platform/UserDefaults.h"
+
+#include <QFontMetricsF>
+#include <QGuiApplication>
+#include <QLinearGradient>
+#include <QPainter>
+#include <QTextLayout>
+#include <algorithm>
+#include <cmath>
+#include <cstddef>
+#include <cstdint>
+#include <string>
+
+namespace {
+
+constexpr int fontSize = 12;
+constexpr int graphiteVariant = 6;
+constexpr std::size_t keptTexts = 4096;
+
+constexpr MenuGradient gradients[2][2] = {
+    {{{81, 112, 246}, {26, 67, 243}, 1}, {{106, 114, 122}, {85, 94, 105}, 1}},
+    {{{72, 105, 246}, {30, 70, 243}, 0.95F}, {{107, 115, 123}, {88, 98, 108}, 0.95F}},
+};
+
+QRectF toQt(const KXRect& rect) {
+    return {rect.x, rect.y, rect.width, rect.height};
+}
+
+QColor grey(float white, float alpha) {
+    return QColor::fromRgbF(white, white, white, alpha);
+}
+
+QColor toQt(const std::uint8_t (&components)[3], float alpha) {
+    QColor color(components[0], components[1], components[2]);
+    color.setAlphaF(alpha);
+    return color;
+}
+
+QString singleLine(const std::string& text) {
+    QString line = QString::fromStdString(text);
+    const auto isBreak = [](QChar c) {
+        return c < u' ' || c == QChar::LineSeparator || c == QChar::ParagraphSeparator;
+    };
+    std::replace_if(line.begin(), line.end(), isBreak, u' ');
+    return line;
+}
+
+/// Lays the line out with its top left at (0, 0).
+QTextLine layOut(QTextLayout& layout) {
+    layout.beginLayout();
+    QTextLine line = layout.createLine();
+    line.setPosition({0, 0});
+    layout.endLayout();
+    return line;
+}
+
+} // namespace
+
+const MenuGradient& menuGradient(MenuGradientUse use, int colorVariant) {
+    return gradients[use == MenuGradientUse::topPane][colorVariant == graphiteVariant];
+}
+
+QRectF MenuHairline(const QPainter& painter, const QRectF& rect) {
+    const QTransform toDevice = painter.deviceTransform();
+    const QRectF device = toDevice.mapRect(rect);
+    const double thickness = std::max(1.0, std::floor(toDevice.m22() * rect.height() + 1e-4));
+    return toDevice.inverted().mapRect(
+        QRectF(device.left(), std::floor(device.top() + 0.5), device.width(), thickness));
+}
+
+MenuPainter::MenuPainter(const platform::UserDefaults& defaults)
+    : m_defaults(defaults)
+    , m_font(QGuiApplication::font()) {
+    m_font.setPixelSize(fontSize);
+}
+
+int MenuPainter::colorVariant() const {
+    return m_defaults.integerForKey("AppleAquaColorVariant");
+}
+
+MenuPainter::Text& MenuPainter::textFor(const std::string& text) {
+    if (const auto known = m_texts.find(text); known != m_texts.end()) return known->second;
+    if (m_texts.size() >= keptTexts) m_texts.clear();
+    QTextLayout layout(singleLine(text), m_font);
+    const QTextLine line = layOut(layout);
+    Text& entry = m_texts[text];
+    entry.size = {static_cast<float>(std::ceil(line.naturalTextWidth())),
+                  static_cast<float>(std::ceil(QFontMetricsF(m_font).height()))};
+    return entry;
+}
+
+KXSize MenuPainter::textSize(const std::string& text) {
+    return textFor(text).size;
+}
+
+const QPen& MenuPainter::pen(float white) {
+    // A pen that is kept costs no allocation when it is set.
+    QPen& pen = m_pens[qRound(white * 255)];
+    if (pen.color() != grey(white, 1)) pen = QPen(grey(white, 1));
+    return pen;
+}
+
+void MenuPainter::drawText(QPainter& painter, const std::string& text, const KXRect& rect, float white) {
+    Text& entry = textFor(text);
+    const float width = std::min(rect.width, entry.size.width);
+    if (width <= 0) return;
+    if (entry.width != width) {
+        QString line = singleLine(text);
+        if (width < entry.size.width) line = QFontMetricsF(m_font).elidedText(line, Qt::ElideRight, width);
+        QTextLayout layout(line, m_font);
+        layOut(layout);
+        entry.glyphs = layout.glyphRuns();
+        entry.width = width;
+    }
+    painter.setPen(pen(white));
+    for (const QGlyphRun& glyphs : entry.glyphs)
+        painter.drawGlyphRun({rect.x, rect.y}, glyphs);
+}
+
+void MenuPainter::fillWhite(QPainter& painter, const KXRect& rect, float white, float alpha) const {
+    const QRectF area = rect.height == 1 ? MenuHairline(painter, toQt(rect)) : toQt(rect);
+    painter.fillRect(area, grey(white, alpha));
+}
+
+void MenuPainter::fillArrow(QPainter& painter, const KXRect& rect, std::int32_t direction,
+                            float white) const {
+    painter.setRenderHint(QPainter::Antialiasing);
+    KXBezierPath::arrowInRect(rect, direction).fill(painter, grey(white, 1));
+    painter.setRenderHint(QPainter::Antialiasing, false);
+}
+
+void MenuPainter::fillHighlight(QPainter& painter, const KXRect& rect) const {
+    fillGradient(painter, rect, MenuGradientUse::rowHighlight);
+}
+
+void MenuPainter::fillGradient(QPainter& painter, const KXRect& rect, MenuGradientUse use) const {
+    const MenuGradient& colors = menuGradient(use, colorVariant());
+    QLinearGradient gradient(0, rect.minY(), 0, rect.maxY());
+    gradient.setColorAt(0, toQt(colors.start, colors.alpha));
+    gradient.setColorAt(1, toQt(colors.end, colors.alpha));
+    painter.fillRect(toQt(rect), gradient);
+}
+
+void MenuPainter::drawIcon(QPainter& painter, const KXImage& image, const KXRect& rect) const {
+    const double ratio = painter.device()->devicePixelRatioF();
+    const double extent = std::max(rect.width, rect.height);
+    const int side = qRound(extent * ratio);
+    const QImage picture = image.squareImage(side);
+    if (picture.isNull()) return;
+    // One pixel of the picture is one of the device, so nothing is scaled again and the edges stay sharp.
+    const QPointF corner(rect.x - (extent - rect.width) / 2, rect.y - (extent - rect.height) / 2);
+    const QTransform toDevice = painter.deviceTransform();
+    const QPointF device = toDevice.map(corner);
+    const QPointF snapped = toDevice.inverted().map(QPointF(std::round(device.x()), std::round(device.y())));
+    painter.drawImage(QRectF(snapped, QSizeF(side / ratio, side / ratio)), picture);
+}

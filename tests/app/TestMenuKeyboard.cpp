@@ -1,0 +1,125 @@
+#include "tests/app/MenuFixtures.h"
+
+#include <gtest/gtest.h>
+
+namespace {
+
+using Titles = std::vector<std::string>;
+using enum SMEditingCommand;
+
+struct MenuKeyboard : testing::Test, MenuWorld {
+    MenuKeyboard() {
+        owner.contents.topMenu = std::make_shared<SMMenuItems>(
+            SMMenuItems{itemTitled("Documents"), itemTitled("off", {{"enabled", false}}),
+                        SMMenuItem::separatorItem(), itemTitled("Help")});
+        owner.contents.pinnedApps = listTitled({"Mail", "Web"});
+        owner.contents.searchableApps = listTitled({"Zebra", "apple", "Éditeur", "Mail"});
+        open();
+    }
+};
+
+TEST_F(MenuKeyboard, FiltersWhileTypingAndPreselectsTheFirst) {
+    type("  e ");
+    EXPECT_EQ(menu->searchState(), SMMenuStateSearch);
+    EXPECT_EQ(rightTitles(), (Titles{"Zebra", "apple", "Éditeur"}));
+    EXPECT_EQ(highlighted(), "Zebra");
+    const auto list = outlets->right;
+    type("ed");
+    EXPECT_EQ(outlets->right, list) << "the same list goes on";
+    EXPECT_EQ(highlighted(), "Éditeur");
+    EXPECT_EQ(outlets->results, 1U);
+    EXPECT_TRUE(press(insertNewline));
+    EXPECT_EQ(owner.log, (Titles{"action Éditeur", "close"}));
+}
+
+TEST_F(MenuKeyboard, EscapeLeavesTheSearchThenCloses) {
+    type("e");
+    EXPECT_TRUE(press(cancelOperation));
+    EXPECT_EQ(outlets->search, "");
+    EXPECT_FALSE(outlets->results) << "there is no search";
+    EXPECT_EQ(rightTitles(), (Titles{"Mail", "Web"}));
+    EXPECT_TRUE(owner.log.empty());
+    EXPECT_TRUE(press(cancelOperation));
+    EXPECT_EQ(owner.log, Titles{"close"});
+}
+
+TEST_F(MenuKeyboard, BlanksAloneSearchForNothing) {
+    const auto list = outlets->right;
+    type("   ");
+    EXPECT_EQ(outlets->right, list);
+    EXPECT_EQ(outlets->search, "   ");
+    type("e");
+    type("  ");
+    EXPECT_EQ(menu->searchState(), SMMenuStateHome);
+    EXPECT_EQ(outlets->search, "");
+}
+
+TEST_F(MenuKeyboard, WalksRoundThePanesOverEnabledRows) {
+    Titles walked;
+    for (int i = 0; i < 7; ++i) {
+        EXPECT_TRUE(press(moveDown));
+        walked.push_back(highlighted());
+        EXPECT_EQ(outlets->reported, highlighted());
+    }
+    const std::string settings = menu->settingsButton()->title();
+    EXPECT_EQ(walked, (Titles{"Documents", "Help", settings, "All Programs", "Mail", "Web", "Web"}));
+    for (auto title = walked.rbegin() + 2; title != walked.rend(); ++title) {
+        press(moveUp);
+        EXPECT_EQ(highlighted(), *title);
+    }
+    press(moveUp);
+    EXPECT_EQ(highlighted(), "Documents") << "the search field ends the walk";
+}
+
+TEST_F(MenuKeyboard, DoesNothingWithoutAHighlight) {
+    EXPECT_TRUE(press(moveUp));
+    EXPECT_TRUE(press(insertNewline));
+    EXPECT_TRUE(press(insertTab));
+    EXPECT_FALSE(press(moveRight));
+    EXPECT_EQ(highlighted(), "none");
+    EXPECT_TRUE(owner.log.empty());
+    outlets->events->mouseMoved(centerOf("off"));
+    press(insertNewline);
+    EXPECT_TRUE(owner.log.empty()) << "nor on a disabled row";
+}
+
+TEST_F(MenuKeyboard, JumpsBetweenThePanesAtTheSameHeightWithoutText) {
+    press(moveDown);
+    EXPECT_FALSE(press(moveLeft)) << "is there already";
+    EXPECT_TRUE(press(moveRight));
+    EXPECT_EQ(highlighted(), "All Programs");
+    outlets->events->mouseMoved(centerOf("Web"));
+    EXPECT_TRUE(press(moveLeft));
+    EXPECT_EQ(highlighted(), "Help");
+    EXPECT_TRUE(press(moveRight));
+    EXPECT_EQ(highlighted(), "Mail");
+    type("mail");
+    EXPECT_FALSE(press(moveLeft)) << "moves the caret";
+}
+
+TEST_F(MenuKeyboard, ScrollsAtTheEndsOfTheListAndReachesEveryRow) {
+    owner.contents.searchableApps = listTitled(numbered("App ", 60));
+    type("app");
+    EXPECT_EQ(highlighted(), "App 0");
+    for (int i = 1; i < 61; ++i) {
+        EXPECT_TRUE(press(moveDown));
+        EXPECT_EQ(highlighted(), "App " + std::to_string(std::min(i, 59)));
+        EXPECT_FALSE(menu->currentMouseOverMenuButton()->isHidden());
+    }
+    for (int i = 0; i < 60; ++i)
+        press(moveUp);
+    EXPECT_EQ(highlighted(), "Back");
+}
+
+TEST_F(MenuKeyboard, ActsOnTheItemEvenWhileItsAlternateShows) {
+    const auto item = itemTitled("Open", {{"altMenuItem", plist::Dictionary{{"title", "Open as root"}}}});
+    owner.contents.pinnedApps = std::make_shared<SMMenuItems>(SMMenuItems{item});
+    menu->reloadData();
+    display();
+    keys.option = true;
+    outlets->events->mouseMoved(centerOf("Open as root"));
+    press(insertNewline);
+    EXPECT_EQ(owner.log.front(), "action Open");
+}
+
+} // namespace

@@ -1,0 +1,88 @@
+#include "server/AgentKeeper.h"
+#include "tests/support/InMemoryPorts.h"
+#include "tests/support/InMemoryProcessTable.h"
+#include "tests/support/ManualMainLoop.h"
+
+#include <gmock/gmock.h>
+
+using namespace tessel;
+using namespace std::chrono_literals;
+using testing::ElementsAre;
+using testing::IsEmpty;
+
+namespace {
+
+constexpr const char* agentID = "com.corvane.tesselStartMenu";
+
+struct Session : ProgramStarter {
+    std::optional<int> start(const std::string&) override {
+        if (!canStart) return std::nullopt;
+        agent = processes.start(++lastPid, agentID);
+        started.push_back(lastPid);
+        return lastPid;
+    }
+    std::string reap(int pid) override {
+        reaped.push_back(pid);
+        return "exit code 0";
+    }
+
+    InMemoryProcessTable processes;
+    ManualMainLoop loop;
+    InMemoryPortNetwork network;
+    InMemoryPorts ports{network, loop, {1000, processes.currentProcess()}};
+    bool canStart = true;
+    int lastPid = 2000;
+    platform::ProcessSerialNumber agent;
+    std::vector<int> started;
+    std::vector<int> reaped;
+    std::optional<AgentKeeper> keeper{
+        std::in_place, AgentKeeper::Services{*this, processes, ports, loop, loop.clock()}, "/agent"};
+};
+
+} // namespace
+
+TEST(AgentKeeper, StartsTheAgentAgainWithGrowingPatience) {
+    Session session;
+    session.keeper->run();
+    ASSERT_THAT(session.started, ElementsAre(2001));
+    session.loop.advance(11s);
+    session.processes.end(session.agent);
+    EXPECT_THAT(session.reaped, ElementsAre(2001));
+    EXPECT_EQ(session.started.size(), 1u) << "not at once";
+    session.loop.advance(250ms);
+    ASSERT_EQ(session.started.size(), 2u);
+    session.processes.end(session.agent);
+    session.loop.advance(499ms);
+    EXPECT_EQ(session.started.size(), 2u) << "it ended soon: the wait doubles";
+    session.loop.advance(1ms);
+    EXPECT_EQ(session.started.size(), 3u);
+    session.keeper.reset();
+    EXPECT_FALSE(session.processes.info(session.agent)) << "it ends with its daemon";
+
+    EXPECT_EQ(RestartDelay(40s, 1s), 60s);
+    EXPECT_EQ(RestartDelay(60s, 9s), 60s);
+    EXPECT_EQ(RestartDelay(60s, 10s), 250ms);
+}
+
+TEST(AgentKeeper, KeepsTryingWhenItCannotBeStarted) {
+    Session session;
+    session.canStart = false;
+    session.keeper->run();
+    session.canStart = true;
+    session.loop.advance(250ms);
+    EXPECT_THAT(session.started, ElementsAre(2001));
+}
+
+TEST(AgentKeeper, KeepsTheAgentThatAKilledDaemonLeft) {
+    Session session;
+    session.processes.start(300, agentID); // of another session: it has no port here
+    const auto left = session.processes.start(400, agentID);
+    const auto port = session.ports.open("com.corvane.kxipc." + std::to_string(left.highLongOfPSN) + ".400");
+    session.keeper->run();
+    EXPECT_THAT(session.started, IsEmpty());
+    port->close();
+    session.processes.end(left);
+    session.loop.advance(250ms);
+    EXPECT_THAT(session.started, ElementsAre(2001));
+    EXPECT_THAT(session.reaped, IsEmpty()) << "it was not ours to wait for";
+}

@@ -1,0 +1,54 @@
+#include "server/Options.h"
+#include "server/Record.h"
+#include "tests/support/ScratchHome.h"
+
+#include <gmock/gmock.h>
+
+using namespace tessel;
+
+TEST(Options, ReadsEveryOptionAndRefusesTheRest) {
+    const char* all[] = {"--no-agent", "--show", "--record", "file", "--machine", "sample", "--select", "1"};
+    std::string error;
+    const auto options = ParseOptions(all, error);
+    ASSERT_TRUE(options) << error;
+    EXPECT_TRUE(!options->startAgent && options->show && !options->help && !options->version);
+    EXPECT_EQ(options->record + *options->machine, "filesample");
+    EXPECT_EQ(options->select, 1u);
+    EXPECT_TRUE(ParseOptions({}, error)->startAgent);
+    for (const std::vector<const char*>& bad : {std::vector{"--select", "-1"},
+                                                {"--select", "1x"},
+                                                {"--record"},
+                                                {"--record", ""},
+                                                {"--hel"},
+                                                {""}}) {
+        EXPECT_FALSE(ParseOptions(bad, error)) << bad.front();
+        EXPECT_NE(error, "");
+    }
+}
+
+TEST(Record, WritesOneBoundedLineForEachMessage) {
+    const ScratchHome home;
+    const std::string path = home.path() / "record";
+    Record record;
+    record.add("goes nowhere");
+    ASSERT_TRUE(record.open(path));
+    record.add("received", KXIPCMessage("menu.refresh", std::nullopt, nullptr));
+    const plist::Value rows = plist::Array{plist::Dictionary{{"title", "x"}}, plist::Dictionary{}};
+    record.add("sent", KXIPCMessage("menu.update", std::nullopt,
+                                    plist::Dictionary{{"menu", plist::Dictionary{{"topMenu", rows}}},
+                                                      {"nameList", plist::Array{"a", "b"}},
+                                                      {"selectedIndex", 1}}));
+    EXPECT_EQ(ScratchHome::contents(path), "menu.refresh received {}\n"
+                                           "menu.update sent {\"menu\": {\"topMenu\": 2}, \"nameList\": "
+                                           "[\"a\", \"b\"], \"selectedIndex\": 1}\n");
+
+    plist::Value nested = plist::Array{};
+    for (int i = 0; i < 400; ++i)
+        nested =
+            plist::Dictionary{{std::string(1000, 'k'), nested}, {"q\"\n", std::string(150, '\xc3') + "é"}};
+    const std::string line = DigestLine("received", KXIPCMessage("menu.onAction", std::nullopt, nested));
+    EXPECT_LT(line.size(), 2000u);
+    EXPECT_THAT(line, testing::HasSubstr("q\\\"\\u000a"));
+    EXPECT_EQ(line.find('\n'), line.npos);
+    EXPECT_FALSE(record.open((home.path() / "no" / "where").string()));
+}

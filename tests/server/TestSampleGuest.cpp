@@ -1,0 +1,104 @@
+#include "server/catalogues/SampleGuest.h"
+#include "server/catalogues/SampleMachine.h"
+#include "server/icons/RawIcons.h"
+#include "tests/support/ScratchHome.h"
+
+#include <QImage>
+
+#include <gmock/gmock.h>
+
+#include <set>
+
+using namespace tessel;
+using testing::HasSubstr;
+
+namespace {
+
+std::string parse(const std::string& text, const SampleLimits& limits = {}) {
+    std::string error;
+    const auto guest = ParseSampleGuest(text, error, limits);
+    if (!guest) return "refused: " + error;
+    std::string rows;
+    VisitItems(guest->catalogue, [&](const CatalogueItem& item) { rows += "[" + item.id + "]"; });
+    return rows;
+}
+
+} // namespace
+
+TEST(SampleGuest, TheShippedOneHasEveryKindOfRowAndAllItsIcons) {
+    const ScratchHome home;
+    const auto machine = SampleMachine::open("sample", KX_SAMPLE_GUEST);
+    ASSERT_TRUE(machine);
+    const auto catalogue = machine->readCatalogue();
+    std::size_t applications = 0, disabled = 0, hiddenTriangles = 0, alternates = 0;
+    std::set<int> states;
+    VisitItems(catalogue->programs, [&](const CatalogueItem& item) {
+        applications += item.kind == ItemKind::application;
+        disabled += !item.enabled;
+        hiddenTriangles += item.hideTriangle;
+        alternates += item.alternate.size();
+        states.insert(item.state);
+    });
+    EXPECT_GE(applications, 60u);
+    EXPECT_GE(disabled * hiddenTriangles * alternates, 1u);
+    EXPECT_EQ(states, (std::set{0, 1, 2}));
+    EXPECT_EQ(catalogue->pinned.size(), 4u);
+    EXPECT_EQ(home.log(), "") << "a row or a name was left out";
+
+    std::set<std::string> icons;
+    VisitItems(*catalogue, [&](const CatalogueItem& item) { icons.insert(item.icon); });
+    icons.erase("");
+    EXPECT_GE(icons.size(), 12u);
+    for (const std::string& icon : icons) {
+        const plist::Value set = machine->readIcon(icon);
+        ASSERT_EQ(set.size(), iconSizes.size()) << icon;
+        for (std::size_t i = 0; i < set.size(); ++i)
+            EXPECT_EQ(set.at(i)["data"].data().size(), std::size_t(iconSizes[i] * iconSizes[i] * 4)) << icon;
+    }
+}
+
+TEST(SampleGuest, RefusesWhatPassesItsBoundsAndLeavesOutWhatMakesNoSense) {
+    const ScratchHome home;
+    EXPECT_THAT(parse("name = "), HasSubstr("refused: line 1: "));
+    EXPECT_THAT(parse("programs = [ { title = \"\xff\" } ]"), HasSubstr("refused: line 1: "));
+    EXPECT_EQ(parse("name = 'abc'", {.bytes = 5}), "refused: the file is too large");
+    EXPECT_EQ(parse("name = 'abc'", {.title = 2}), "refused: the name is too long");
+    EXPECT_EQ(parse("programs = [{title='a'}, {title='b'}]", {.items = 1}),
+              "refused: there are too many rows");
+    EXPECT_EQ(parse("programs = [{title='a', items=[{title='b', items=[]}]}]", {.depth = 1}),
+              "refused: folders are nested too deeply");
+    EXPECT_THAT(parse("a = " + std::string(100'000, '[')), HasSubstr("refused: "));
+
+    EXPECT_EQ(parse(""), "");
+    EXPECT_EQ(
+        parse("programs = 7\ntop = [1, {}, {title=''}, {title=3}, {title='ok', items=2}, {title='ok'}]"),
+        "[top/ok]");
+    EXPECT_EQ(parse("programs=[{title='a', state='x', alternate={title='b', alternate={title='c'}}}]\n"
+                    "top=[{application='a'}, {application='nobody'}]\npinned=['a', 'nobody', 4]"),
+              "[a][a/alternate/b][a/alternate/b/alternate/c][a][a/alternate/b][a/alternate/b/alternate/c]");
+    EXPECT_THAT(home.log(), HasSubstr("no application \"nobody\" for \"pinned\""));
+    EXPECT_FALSE(SampleMachine::open("sample", home.path().string()));
+}
+
+TEST(IconFolder, ReadsNoFileButItsOwnPictures) {
+    const ScratchHome home;
+    const std::string head = R"(<svg xmlns="http://www.w3.org/2000/svg" viewBox="0 0 2 2">)";
+    const std::string good = head + R"(<path d="M0 1h2v1h-2z" fill="#ff8000" fill-opacity="0.5"/></svg>)";
+    std::ofstream(home.path() / "good.svg") << good;
+    std::ofstream(home.path() / "large.svg") << good << std::string(300'000, ' ');
+    std::ofstream(home.path() / "broken.svg") << "GIF89a";
+    std::filesystem::create_directory(home.path() / "inner");
+    const IconFolder folder(home.path());
+    for (const char* name : {"inner/../good", "large", "broken", "absent"})
+        EXPECT_TRUE(folder.read(name).isNil()) << name;
+
+    const plist::Value icon = folder.read("good").at(0);
+    EXPECT_EQ(icon["format"], plist::Value("bgra"));
+    const plist::Data data = icon["data"].data();
+    const auto channel = [&](std::size_t row, std::size_t byte) { return int(data.data()[row * 64 + byte]); };
+    EXPECT_NEAR(channel(0, 0), 0x00, 2) << "the bottom row comes first, blue first, not multiplied by alpha";
+    EXPECT_NEAR(channel(0, 1), 0x80, 2);
+    EXPECT_NEAR(channel(0, 2), 0xff, 2);
+    EXPECT_NEAR(channel(0, 3), 0x80, 2);
+    EXPECT_EQ(channel(15, 3), 0);
+}

@@ -1,0 +1,109 @@
+"""What the end-to-end tests do on a private X server: start programs, point, type, look."""
+
+import os
+import re
+import subprocess
+import time
+
+
+def run(*command):
+    return subprocess.run(command, capture_output=True, text=True, check=False).stdout
+
+
+def wait_until(what, condition, seconds=30):
+    """The condition's first true answer. Polls; fails with `what` when the time is over."""
+    deadline = time.monotonic() + seconds
+    while True:
+        answer = condition()
+        if answer:
+            return answer
+        if time.monotonic() > deadline:
+            raise AssertionError(f"waited {seconds} s in vain: {what}")
+        time.sleep(0.02)
+
+
+class Window:
+    """A window that can be seen, told by its name."""
+
+    def __init__(self, name):
+        self.name = name
+
+    def id(self):
+        return run("xdotool", "search", "--onlyvisible", "--name", f"^{self.name}$").split("\n")[0]
+
+    def is_open(self):
+        return bool(self.id())
+
+    def frame(self):
+        """(x, y, width, height), from the top left of the screen."""
+        text = run("xdotool", "getwindowgeometry", "--shell", self.id())
+        return tuple(int(re.search(f"^{key}=(-?[0-9]+)", text, re.M)[1]) for key in ("X", "Y", "WIDTH", "HEIGHT"))
+
+
+def point(x, y):
+    run("xdotool", "mousemove", str(x), str(y))
+
+
+def click(x, y, button=1):
+    run("xdotool", "mousemove", str(x), str(y), "click", str(button))
+
+
+def type_text(text):
+    run("xdotool", "type", "--delay", "5", text)
+
+
+def press(key):
+    run("xdotool", "key", key)
+
+
+class Picture:
+    """The screen as it is now."""
+
+    def __init__(self):
+        raw = subprocess.run(["import", "-window", "root", "-depth", "8", "-type", "TrueColor", "ppm:-"],
+                             capture_output=True, check=True).stdout
+        header = re.match(rb"P6\s+(\d+)\s+(\d+)\s+255\s", raw)
+        self.width, self.height = int(header[1]), int(header[2])
+        self.pixels = raw[header.end():]
+
+    def pixel(self, x, y):
+        at = 3 * (y * self.width + x)
+        return tuple(self.pixels[at:at + 3])
+
+    def inked_runs(self, x, width, top, bottom):
+        """Vertical stretches (top, bottom) in which some pixel of the columns is not white."""
+        white = bytes([255]) * (3 * width)
+        runs, start = [], None
+        for y in range(top, bottom + 1):
+            at = 3 * (y * self.width + x)
+            inked = y < bottom and self.pixels[at:at + 3 * width] != white
+            if inked and start is None:
+                start = y
+            elif not inked and start is not None:
+                runs.append((start, y))
+                start = None
+        return runs
+
+
+class Program:
+    """A program of the build under test. Ends with the test."""
+
+    running = []
+
+    def __init__(self, name, *arguments):
+        self.process = subprocess.Popen([os.path.join(os.environ["KX_TEST_BIN"], name), *arguments])
+        Program.running.append(self)
+
+    def kill(self):
+        self.process.kill()
+        self.process.wait()
+
+    @classmethod
+    def end_all(cls):
+        for program in cls.running:
+            if program.process.poll() is None:
+                program.process.terminate()
+                try:
+                    program.process.wait(20)
+                except subprocess.TimeoutExpired:
+                    program.kill()

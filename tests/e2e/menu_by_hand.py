@@ -1,0 +1,115 @@
+#!/usr/bin/env python3
+"""The open menu under real hands: the keyboard alone, keys and clicks during a slide, and another window.
+
+Started by tools/with-display, with KX_TEST_BIN naming the programs' folder."""
+
+import os
+import subprocess
+import tempfile
+import unittest
+
+from desktop import Picture, Program, Window, click, point, press, run, type_text, wait_until
+
+STATUS_ITEM = Window("Tessel status item")
+PANEL = Window("Tessel start menu")
+LEFT_PANE = 170
+ACTION_BUTTON = 62  # its height in the panel: "All Programs" or "Back"
+
+
+class MenuByHand(unittest.TestCase):
+    @classmethod
+    def setUpClass(cls):
+        cls.home = tempfile.TemporaryDirectory()
+        os.environ.update(HOME=cls.home.name, XDG_DATA_HOME=cls.home.name + "/data",
+                          XDG_CONFIG_HOME=cls.home.name + "/config")
+        cls.record = os.path.join(cls.home.name, "record")
+        cls.install([f"Program {i:02}" for i in range(40)] + ["Calculator"])
+        Program("tesselDaemon", "--record", cls.record, "--machine", "host")
+        wait_until("the status item", STATUS_ITEM.is_open)
+        wait_until("an update", lambda: cls.recorded("menu.update sent"))
+
+    @classmethod
+    def install(cls, titles):
+        folder = os.path.join(cls.home.name, "data", "applications")
+        os.makedirs(folder)
+        for title in titles:
+            with open(os.path.join(folder, title.replace(" ", "") + ".desktop"), "w", encoding="utf-8") as file:
+                file.write(f"[Desktop Entry]\nType=Application\nName={title}\nExec=true\n")
+
+    @classmethod
+    def tearDownClass(cls):
+        Program.end_all()
+        cls.home.cleanup()
+
+    @classmethod
+    def recorded(cls, start):
+        with open(cls.record, encoding="utf-8") as file:
+            return [line for line in file.read().splitlines() if line.startswith(start)]
+
+    def setUp(self):
+        x, y, width, height = STATUS_ITEM.frame()
+        click(x + width // 2, y + height // 2)
+        wait_until("the panel", PANEL.is_open)
+        point(5, 790)  # no row under the pointer
+
+    def tearDown(self):
+        while PANEL.is_open():
+            press("Escape")
+
+    def right_pane(self):
+        x, y, width, height = PANEL.frame()
+        picture = Picture()
+        lines = range(y + ACTION_BUTTON + 24, y + height - 12)
+        return [picture.pixels[3 * (line * picture.width + x + LEFT_PANE + 10):
+                               3 * (line * picture.width + x + width - 15)] for line in lines]
+
+    def changes(self, what, action):
+        before = self.right_pane()
+        action()
+        wait_until(what, lambda: self.right_pane() != before)
+
+    def search(self, text):
+        self.changes("results", lambda: type_text(text))
+
+    def chosen(self, action):
+        before = len(self.recorded("menu.onAction received"))
+        action()
+        wait_until("an action", lambda: len(self.recorded("menu.onAction received")) > before)
+        wait_until("the panel to close", lambda: not PANEL.is_open())
+        return self.recorded("menu.onAction received")[-1]
+
+    def test_keys_and_clicks_during_a_slide_are_not_lost(self):
+        x, y, _, _ = PANEL.frame()
+        for _ in range(5):  # opens, and at once back, and types while that still slides
+            run("xdotool", "mousemove", str(x + LEFT_PANE + 60), str(y + ACTION_BUTTON), "click", "1",
+                "mousemove", str(x + LEFT_PANE + 60), str(y + ACTION_BUTTON), "click", "1",
+                "type", "--delay", "1", "calculator")
+            self.assertIn("Calculator", self.chosen(lambda: press("Return")))
+            self.setUp()
+            press("Escape")  # the search
+
+    def test_the_keyboard_alone_reaches_rows_out_of_view(self):
+        self.search("program")
+        run("xdotool", "key", "--repeat", "30", "--delay", "5", "Down")
+        self.assertIn("Program30", self.chosen(lambda: press("Return")))
+        self.setUp()
+        run("xdotool", "key", "--repeat", "29", "--delay", "5", "Down", "key", "--repeat", "3", "Up")
+        self.assertIn("Program26", self.chosen(lambda: press("Return")), "the search survives a short closing")
+        self.setUp()
+        press("Escape")
+
+    def test_another_window_takes_the_keyboard_and_closes_it(self):
+        other = subprocess.Popen(["xmessage", "-geometry", "200x100+100+600", "another window"])
+        try:
+            wait_until("the panel to close", lambda: not PANEL.is_open())
+        finally:
+            other.kill()
+            other.wait()
+
+    def test_a_click_outside_closes_it(self):
+        click(200, 700)
+        wait_until("the panel to close", lambda: not PANEL.is_open())
+
+
+if __name__ == "__main__":
+    unittest.main(verbosity=2)

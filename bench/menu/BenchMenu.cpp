@@ -1,0 +1,258 @@
+/// benchMenu [--filter]: the menu's real window on the display it is started on, timed from inside, from an
+/// event to a picture that the X server has taken. With --filter a compositing manager seems to blur behind
+/// windows; it must not run then. Prints "job<TAB>figure<TAB>unit" lines.
+
+#include "app/SMMenuListWidget.h"
+#include "app/SMMenuWindowForm.h"
+#include "app/SMSearchField.h"
+#include "platform/UserDefaults.h"
+#include "platform/linux/QtMainLoop.h"
+#include "platform/linux/QtModifierKeys.h"
+#include "platform/linux/QtWindowServer.h"
+#include "platform/linux/SystemClock.h"
+#include "platform/linux/XcbConnection.h"
+
+#include <QApplication>
+#include <QKeyEvent>
+#include <QWindow>
+#include <algorithm>
+#include <cstdio>
+#include <cstring>
+#include <malloc.h>
+#include <string_view>
+
+namespace {
+
+std::size_t allocations = 0;
+
+} // namespace
+
+extern "C" {
+void* __libc_malloc(std::size_t size);
+/// Counts; operator new and the toolkit's own arrays come here too.
+void* malloc(std::size_t size) {
+    ++allocations;
+    return __libc_malloc(size);
+}
+}
+
+namespace {
+
+using Clock = std::chrono::steady_clock;
+
+struct Defaults final : platform::UserDefaults {
+    int integerForKey(const std::string&) const override { return 0; }
+};
+
+struct Owner final : SMMenuWindowOwner {
+    SMMenuModel contents;
+    const SMMenuModel& model() const override { return contents; }
+    void performMenuItemAction(const SMMenuItem&) override {}
+    void showMenuSettings() override {}
+    void selectIndex(std::int32_t) override {}
+    void closeMenuWindow() override {}
+    KXRect statusItemFrame() const override { return {1250, 778, 30, 22}; }
+};
+
+SMMenuModel::List applications(int count) {
+    constexpr const char* stems[] = {"Calculator", "Éditeur",  "Mail",   "Музыка",
+                                     "Übersicht",  "Terminal", "Photos", "Notes"};
+    auto items = std::make_shared<SMMenuItems>();
+    for (int i = 0; i < count; ++i) {
+        const std::string title = std::string(stems[i % 8]) + " " + std::to_string(i);
+        items->push_back(SMMenuItem::initWithDictionary(
+            plist::Dictionary{{"title", title}, {"iconFileType", i % 2 ? "txt" : "png"}}));
+    }
+    return items;
+}
+
+double percentile(std::vector<double> values, double part) {
+    std::ranges::sort(values);
+    return values[static_cast<std::size_t>(part * static_cast<double>(values.size() - 1))];
+}
+
+void report(const std::string& job, double figure, const char* unit) {
+    std::printf("%s\t%.3f\t%s\n", job.c_str(), figure, unit);
+}
+
+template <typename Work>
+double milliseconds(Work work) {
+    const auto start = Clock::now();
+    work();
+    return std::chrono::duration<double, std::milli>(Clock::now() - start).count();
+}
+
+void reportTimes(const std::string& job, const std::vector<double>& times) {
+    report(job + ", median", percentile(times, 0.5), "ms");
+    report(job + ", 99th percentile", percentile(times, 0.99), "ms");
+}
+
+class Bench final : QObject {
+public:
+    Bench() {
+        m_owner.contents.topMenu = applications(8);
+        m_owner.contents.nameList = {"Guest"};
+        takeUpdate(300);
+        m_window = SMMakeMenuWindow(m_owner, {m_server, m_clock, m_loop, m_keys, m_defaults});
+        m_window->setFrame({801, 778 - m_window->frame().height, 480, m_window->frame().height});
+        for (QWidget* widget : QApplication::topLevelWidgets())
+            if (widget->objectName() == "menuWindow") m_view = widget;
+        m_field = m_view->findChild<SMSearchField*>("searchField");
+    }
+
+    void lists() {
+        for (const int count : {10, 1000, 10000}) {
+            const SMMenuModel::List items = applications(count);
+            std::vector<double> building;
+            std::vector<double> showing;
+            for (int round = 0; round < 51; ++round) {
+                SMMenuCollectionView list({m_clock, m_loop, m_keys});
+                list.setShowTopSeparator(true);
+                list.setStyle(SMMenuButtonStyleList);
+                list.setSize({300, 450});
+                building.push_back(milliseconds([&] {
+                    list.setMenuItems(*items);
+                    list.performLayout();
+                }));
+                showing.push_back(milliseconds([&] { list.scrollItemToVisible(items->back().get()); }));
+            }
+            const std::string rows = std::to_string(count) + " rows, ";
+            report(rows + "built and laid out", percentile(building, 0.5), "ms");
+            report(rows + "the last brought into view", percentile(showing, 0.5), "ms");
+        }
+    }
+
+    void opening() {
+        std::vector<double> plain;
+        std::vector<double> updated;
+        for (int round = 0; round < 60; ++round) {
+            plain.push_back(milliseconds([this] { open(); }));
+            close();
+            updated.push_back(milliseconds([this] {
+                takeUpdate(300);
+                open();
+            }));
+            close();
+        }
+        report("first click to painted panel", plain.front(), "ms");
+        reportTimes("click to painted panel", plain);
+        reportTimes("click to painted panel, with an update of 300 applications", updated);
+    }
+
+    void typing() {
+        m_owner.contents.searchableApps = applications(10000);
+        open();
+        std::vector<double> times;
+        for (int round = 0; round < 30; ++round)
+            for (const char* word : {"calcu", "mail 9", "музы", "edit", "e"}) {
+                for (const QChar letter : QString::fromUtf8(word))
+                    times.push_back(milliseconds([&] { press(0, QString(letter)); }));
+                press(Qt::Key_Escape, {});
+            }
+        reportTimes("key press to painted results of 10,000 applications", times);
+        close();
+    }
+
+    void repaint() {
+        open();
+        press(0, "e");
+        auto* box = m_view->findChild<SMMenuListWidget*>("rightMenuBox");
+        box->repaint();
+        const auto allocationsOf = [box](const QRect& area) {
+            box->repaint(area);
+            const std::size_t before = allocations;
+            box->repaint(area);
+            return static_cast<double>(allocations - before);
+        };
+        const int height = box->height();
+        report("allocations in a repaint of half of the rows",
+               allocationsOf({0, height / 2, box->width(), height / 2}), "");
+        report("allocations in a repaint of all rows", allocationsOf(box->rect()), "");
+        std::vector<double> times;
+        for (int round = 0; round < 51; ++round)
+            times.push_back(milliseconds([this] { m_view->repaint(); }));
+        report("repaint of the whole panel", percentile(times, 0.5), "ms");
+        press(Qt::Key_Escape, {});
+        close();
+    }
+
+    void growth() {
+        const auto openWithUpdates = [this](int count) {
+            for (int round = 0; round < count; ++round) {
+                takeUpdate(30);
+                open();
+                press(0, "e");
+                press(Qt::Key_Escape, {});
+                close();
+            }
+            return mallinfo2().uordblks;
+        };
+        const auto before = openWithUpdates(200);
+        const auto after = openWithUpdates(1000);
+        report("heap growth over 1,000 openings with updates",
+               (static_cast<double>(after) - static_cast<double>(before)) / 1024, "KiB");
+    }
+
+private:
+    void takeUpdate(int count) {
+        m_owner.contents.searchableApps = applications(count);
+        m_owner.contents.pinnedApps = applications(5);
+        m_owner.contents.frequentlyUsedApps = applications(10);
+        if (m_window) m_window->reloadData();
+    }
+    /// What is due is painted, and the X server has it.
+    void settle() {
+        QCoreApplication::processEvents();
+        QCoreApplication::sendPostedEvents();
+        auto* c = platform::XcbConnection();
+        std::free(xcb_get_input_focus_reply(c, xcb_get_input_focus(c), nullptr));
+    }
+    void open() {
+        m_window->reloadData();
+        m_window->updateWindowHeight();
+        m_window->showMenuWindow();
+        settle();
+    }
+    void close() {
+        m_window->hideMenuWindow();
+        settle();
+    }
+    void press(int key, const QString& text) {
+        QKeyEvent event(QEvent::KeyPress, key, Qt::NoModifier, text);
+        QCoreApplication::sendEvent(m_field, &event);
+        settle();
+    }
+
+    platform::SystemClock m_clock;
+    platform::QtMainLoop m_loop;
+    platform::QtModifierKeys m_keys;
+    platform::QtWindowServer m_server;
+    Defaults m_defaults;
+    Owner m_owner;
+    std::unique_ptr<SMMenuWindow> m_window;
+    QWidget* m_view = nullptr;
+    SMSearchField* m_field = nullptr;
+};
+
+} // namespace
+
+int main(int argc, char** argv) {
+    QApplication application(argc, argv);
+    auto* c = platform::XcbConnection();
+    if (!c) return 1;
+    const bool filter = argc > 1 && std::string_view(argv[1]) == "--filter";
+    const auto atom = platform::XcbAtom(c, "_KDE_NET_WM_BLUR_BEHIND_REGION");
+    const auto root = platform::XcbRootWindow(c);
+    if (filter) xcb_change_property(c, XCB_PROP_MODE_REPLACE, root, atom, XCB_ATOM_CARDINAL, 32, 0, nullptr);
+    Bench bench;
+    bench.opening();
+    if (filter) {
+        xcb_delete_property(c, root, atom);
+    } else {
+        bench.lists();
+        bench.typing();
+        bench.repaint();
+        bench.growth();
+    }
+    return 0;
+}

@@ -172,8 +172,8 @@ void StartMenuServer::postUpdate() {
 }
 
 void StartMenuServer::post(const KXIPCMessage& message) {
-    m_record.add("sent", message);
     m_server.postMessage(message, false);
+    m_record.add("sent", message);
 }
 
 } // namespace tessel

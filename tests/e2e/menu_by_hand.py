@@ -4,11 +4,13 @@
 Started by tools/with-display, with KX_TEST_BIN naming the programs' folder."""
 
 import os
+import re
 import subprocess
 import tempfile
 import unittest
 
 from desktop import Picture, Program, Window, click, point, press, run, type_text, wait_until
+from peer import Peer, process_number
 
 STATUS_ITEM = Window("Tessel status item")
 PANEL = Window("Tessel start menu")
@@ -24,9 +26,12 @@ class MenuByHand(unittest.TestCase):
                           XDG_CONFIG_HOME=cls.home.name + "/config")
         cls.record = os.path.join(cls.home.name, "record")
         cls.install([f"Program {i:02}" for i in range(40)] + ["Calculator"])
-        Program("tesselDaemon", "--record", cls.record, "--machine", "host")
+        daemon = Program("tesselDaemon", "--record", cls.record, "--machine", "host")
         wait_until("the status item", STATUS_ITEM.is_open)
-        wait_until("an update", lambda: cls.recorded("menu.update sent"))
+        cls.wait_for("^menu.update sent")
+        cls.peer = Peer(os.path.join(os.environ["XDG_RUNTIME_DIR"], "com.corvane.kxipc"))
+        agent, = run("pgrep", "--parent", str(daemon.process.pid), "corvane-tessel").split()
+        cls.agent_port = Peer.port_of(process_number(int(agent)))
 
     @classmethod
     def install(cls, titles):
@@ -38,19 +43,30 @@ class MenuByHand(unittest.TestCase):
 
     @classmethod
     def tearDownClass(cls):
+        cls.peer.close()
         Program.end_all()
         cls.home.cleanup()
 
     @classmethod
-    def recorded(cls, start):
+    def recorded(cls):
         with open(cls.record, encoding="utf-8") as file:
-            return [line for line in file.read().splitlines() if line.startswith(start)]
+            return file.read()
+
+    @classmethod
+    def wait_for(cls, pattern, after=""):
+        """Until the record holds such lines behind what it held before."""
+        return wait_until(pattern, lambda: re.search(pattern, cls.recorded().removeprefix(after), re.S | re.M))
 
     def setUp(self):
+        """Opens the panel, and waits until it shows the update that it asked for: that begins the walk anew."""
+        before = self.recorded()
         x, y, width, height = STATUS_ITEM.frame()
         click(x + width // 2, y + height // 2)
         wait_until("the panel", PANEL.is_open)
         point(5, 790)  # no row under the pointer
+        self.wait_for("^menu.refresh received.*^menu.update sent", before)
+        handled = self.peer.send(self.agent_port, "are you there", synchronous=True)
+        self.assertTrue(handled, "and with it all that came before")
 
     def tearDown(self):
         while PANEL.is_open():
@@ -72,11 +88,11 @@ class MenuByHand(unittest.TestCase):
         self.changes("results", lambda: type_text(text))
 
     def chosen(self, action):
-        before = len(self.recorded("menu.onAction received"))
+        before = self.recorded()
         action()
-        wait_until("an action", lambda: len(self.recorded("menu.onAction received")) > before)
         wait_until("the panel to close", lambda: not PANEL.is_open())
-        return self.recorded("menu.onAction received")[-1]
+        # A launch changes what is used frequently, which is an update by itself.
+        return self.wait_for("^menu.onAction received ([^\n]*).*^launchApplication: performed.*^menu.update sent", before)[1]
 
     def test_keys_and_clicks_during_a_slide_are_not_lost(self):
         x, y, _, _ = PANEL.frame()

@@ -117,7 +117,7 @@ plist::Value SMMenuItem::sendActionInfo() const {
     plist::Dictionary info;
     if (m_action) info.set("action", *m_action);
     if (m_tag != 0) info.set("tag", m_tag);
-    info.set("representedObject", m_representedObject);
+    if (!m_representedObject.isNil()) info.set("representedObject", m_representedObject);
     return info;
 }
 

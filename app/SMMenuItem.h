@@ -8,6 +8,7 @@
 #include <memory>
 #include <optional>
 #include <string>
+#include <utility>
 
 class KXImage;
 
@@ -26,20 +27,37 @@ public:
     static Pointer flexibleSpaceItem();
 
     const std::optional<std::string>& action() const { return m_action; }
+    void setAction(std::optional<std::string> action) { m_action = std::move(action); }
     std::int32_t tag() const { return m_tag; }
+    void setTag(std::int32_t tag) { m_tag = tag; }
     const plist::Value& representedObject() const { return m_representedObject; }
+    void setRepresentedObject(plist::Value object) { m_representedObject = std::move(object); }
     const std::string& title() const { return m_title; }
+    void setTitle(std::string title) { m_title = std::move(title); }
     bool enabled() const { return m_enabled; }
+    void setEnabled(bool enabled) { m_enabled = enabled; }
     std::int32_t itemState() const { return m_itemState; }
+    void setItemState(std::int32_t state) { m_itemState = state; }
     bool isSeparator() const { return m_isSeparator; }
+    void setIsSeparator(bool isSeparator) { m_isSeparator = isSeparator; }
     bool isFlexibleSpace() const { return m_isFlexibleSpace; }
+    void setIsFlexibleSpace(bool isFlexibleSpace) { m_isFlexibleSpace = isFlexibleSpace; }
     bool hideTriangle() const { return m_hideTriangle; }
+    void setHideTriangle(bool hideTriangle) { m_hideTriangle = hideTriangle; }
+    const plist::Value& rawIcons() const { return m_rawIcons; } ///< nil once they are converted
+    void setRawIcons(plist::Value rawIcons) { m_rawIcons = std::move(rawIcons); }
+    const std::string& iconFileType() const { return m_iconFileType; } ///< empty once it is converted
+    void setIconFileType(std::string type) { m_iconFileType = std::move(type); }
     const SMMenuModel::List& submenu() const { return m_submenu; } ///< null for a leaf
+    void setSubmenu(SMMenuModel::List submenu) { m_submenu = std::move(submenu); }
     Pointer parent() const { return m_parent.lock(); }
+    void setParent(const Pointer& parent) { m_parent = parent; }
     const Pointer& altMenuItem() const { return m_altMenuItem; }
+    void setAltMenuItem(Pointer item) { m_altMenuItem = std::move(item); }
 
     /// Made on first use, then kept; null when the item has none.
     std::shared_ptr<KXImage> icon();
+    void setIcon(std::shared_ptr<KXImage> icon) { m_icon = std::move(icon); }
 
     plist::Value sendActionInfo() const;
     /// An item counts as its own child; null is nobody's.

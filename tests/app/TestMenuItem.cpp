@@ -55,6 +55,8 @@ TEST(MenuItem, CountsWrongTypesAsAbsent) {
                     !item->isSeparator());
         EXPECT_FALSE(item->submenu() || item->altMenuItem() || item->icon() || item->hideTriangle());
         EXPECT_EQ(item->sendActionInfo(), Value(Dictionary{{"representedObject", ""}}));
+        item->setRepresentedObject(nullptr);
+        EXPECT_EQ(item->sendActionInfo(), Value(Dictionary{}));
     }
 }
 
@@ -118,7 +120,9 @@ TEST(MenuItem, MakesItsIconOnceFromTheFirstSourceThatItHas) {
 
 TEST(MenuItem, ComparesTitlesWithoutCase) {
     const auto titled = [](const char* text) {
-        return SMMenuItem::initWithDictionary(Dictionary{{"title", text}});
+        const auto item = std::make_shared<SMMenuItem>();
+        item->setTitle(text);
+        return item;
     };
     EXPECT_EQ(titled("ÄPFEL")->titleCompare(*titled("äpfel")), 0);
     EXPECT_LT(titled("alpha")->titleCompare(*titled("Beta")), 0);

@@ -86,6 +86,7 @@ void SMController::onStatusItemClicked() {
         closeMenuWindow();
         return;
     }
+    const auto typing = m_services.holdTyping(); // however long this takes, no letter is lost
     if (m_menuWindow)
         m_menuWindow->reloadData();
     else
@@ -96,6 +97,10 @@ void SMController::onStatusItemClicked() {
     // Should terminating have returned, there is neither any more.
     if (m_statusItemView) m_statusItemView->setIsSelected(true);
     if (m_menuProxy) m_menuProxy->refresh();
+}
+
+void SMController::openMenuWindow() {
+    if (!isMenuWindowVisible()) onStatusItemClicked();
 }
 
 void SMController::placeMenuWindow() {

@@ -4,6 +4,7 @@
 #include "app/SMMenuWindow.h"
 #include "app/SMMenuWindowOwner.h"
 #include "app/SMStatusItemView.h"
+#include "platform/MainLoop.h"
 #include "platform/StatusBar.h"
 
 #include <functional>
@@ -18,6 +19,8 @@ struct SMServices {
     const KXWorkspace& sharedWorkspace;
     std::function<std::unique_ptr<KXIPCClient>()> makeClient;
     std::function<std::unique_ptr<SMMenuWindow>(SMMenuWindowOwner&)> makeMenuWindow;
+    /// What is typed until the handle ends waits for whoever has the keyboard then.
+    std::function<std::unique_ptr<platform::Handle>()> holdTyping;
     /// Runs `applicationWillTerminate` and ends the process inside the call.
     std::function<void()> terminate;
 };
@@ -42,6 +45,8 @@ public:
 
     /// Opens the menu, or closes it when it is open.
     void onStatusItemClicked();
+    /// Opens the menu; unlike the main application's "show", does nothing when it is open.
+    void openMenuWindow();
     /// Safe at any time, also from inside itself: hiding the window takes the keyboard from it, which closes
     /// again.
     void closeMenuWindow() override;

@@ -77,8 +77,9 @@ void AgentKeeper::onEnd() {
     m_lastDelay = RestartDelay(m_lastDelay, ranFor);
     m_agent.reset();
     const int child = std::exchange(m_child, 0);
-    const std::string how = child ? m_services.starter.reap(child) : "not our child";
-    Log("The agent has ended (%s); it is started again in %lld ms\n", how.c_str(),
+    const auto fault = child ? m_services.starter.reap(child) : "not our child";
+    if (!fault) return Log("The agent has ended, as it was asked to\n");
+    Log("The agent has ended (%s); it is started again in %lld ms\n", fault->c_str(),
         static_cast<long long>(m_lastDelay.count()));
     m_restartTimer = m_services.mainLoop.startTimer(m_lastDelay, 0ms, [this] { run(); });
 }

@@ -16,15 +16,17 @@ public:
     virtual ~ProgramStarter() = default;
     /// The id of the new process; nothing, and logged, when it cannot be started.
     virtual std::optional<int> start(const std::string& path) = 0;
-    /// Lets go of a process that we started and that has ended; how it ended, for people.
-    virtual std::string reap(int pid) = 0;
+    /// Lets go of a process that we started and that has ended; how it ended, for people, and nothing when it
+    /// ended well.
+    virtual std::optional<std::string> reap(int pid) = 0;
 };
 
 /// How long to wait before the agent is started again: longer each time that it ends soon after its start.
 std::chrono::milliseconds RestartDelay(std::chrono::milliseconds lastDelay, std::chrono::milliseconds ranFor);
 
-/// Sees to it that the agent runs. One that is there already, left by a daemon that was killed, is kept: it
-/// must have a port of its own in this session. Main thread only.
+/// Sees to it that the agent runs, until it ends well, which it does when the user asks it to. One that is
+/// there already, left by a daemon that was killed, is kept: it must have a port of its own in this session.
+/// Main thread only.
 class AgentKeeper {
 public:
     struct Services {

@@ -3,6 +3,7 @@
 #include "lib/ipc/KXIPCContext.h"
 #include "lib/ipc/KXIPCNames.h"
 #include "platform/linux/LinuxPorts.h"
+#include "platform/linux/PrivateDirectory.h"
 #include "platform/linux/ProcProcessTable.h"
 #include "platform/linux/QtMainLoop.h"
 #include "platform/linux/SystemClock.h"
@@ -13,6 +14,7 @@
 #include "server/Worker.h"
 #include "server/catalogues/Machine.h"
 #include "server/catalogues/SampleMachine.h"
+#include "server/linux/BusLoss.h"
 #include "server/linux/HostMachine.h"
 #include "server/linux/SpawnedPrograms.h"
 
@@ -21,6 +23,7 @@
 #include <algorithm>
 #include <cstdio>
 #include <cstdlib>
+#include <fcntl.h>
 #include <filesystem>
 #include <memory>
 #include <optional>
@@ -58,6 +61,10 @@ std::optional<std::size_t> SelectedMachine(const Options& options,
     return std::nullopt;
 }
 
+void Say(const std::string& reason) {
+    std::fprintf(stderr, "%s: %s\n", programName, reason.c_str());
+}
+
 /// Everything that the daemon is made of, each on those before it. Lives inside the application object.
 class Daemon {
 public:
@@ -92,7 +99,7 @@ public:
 private:
     static bool fail(const char* reason) {
         Log("Cannot run: %s\n", reason);
-        std::fprintf(stderr, "%s: %s\n", programName, reason);
+        Say(reason);
         return false;
     }
 
@@ -121,6 +128,12 @@ private:
 int Run(const Options& options) {
     SetLogBaseName(programName);
     SetExceptionLogging(true);
+    const std::string directory = platform::DefaultPortDirectory();
+    if (!platform::OpenPrivateDirectory(AT_FDCWD, directory)) { // which has said why in the log
+        Say(directory + " cannot be used");
+        return EXIT_FAILURE;
+    }
+    SurviveBusLoss();
     // Icons need the toolkit, windows there are none. The environment would say so to every program that we
     // start.
     char name[] = "tesselDaemon", option[] = "-platform", platform[] = "offscreen";
@@ -138,7 +151,7 @@ int main(int argc, char* argv[]) {
     std::string error;
     const auto options = tessel::ParseOptions({argv + 1, argv + argc}, error);
     if (!options) {
-        std::fprintf(stderr, "%s: %s (try --help)\n", tessel::programName, error.c_str());
+        tessel::Say(error + " (try --help)");
         return 2;
     }
     if (options->help || options->version) {

@@ -26,6 +26,10 @@ bool IsOurs(const struct stat& status) {
     return S_ISDIR(status.st_mode) && status.st_uid == geteuid();
 }
 
+bool IsOursAlone(const struct stat& status) {
+    return IsOurs(status) && (status.st_mode & (S_IRWXU | S_IRWXG | S_IRWXO)) == S_IRWXU;
+}
+
 } // namespace
 
 std::string DefaultPortDirectory() {
@@ -45,14 +49,23 @@ Descriptor OpenPrivateDirectory(int at, const std::string& path) {
     }
     Descriptor directory(openat(at, path.c_str(), O_RDONLY | O_DIRECTORY | O_NOFOLLOW | O_CLOEXEC));
     struct stat status = {};
-    const auto allRights = S_IRWXU | S_IRWXG | S_IRWXO;
-    if (!directory || fstat(directory.get(), &status) != 0 || !IsOurs(status) ||
-        (status.st_mode & allRights) != S_IRWXU) {
+    if (!directory || fstat(directory.get(), &status) != 0 || !IsOursAlone(status)) {
         Log("IPC: %s: %s is not a directory of this user alone, refusing to use it\n", "OpenPrivateDirectory",
             path.c_str());
         return {};
     }
     return directory;
+}
+
+std::string PrivateDirectoryFault(const std::string& path) {
+    struct stat status = {};
+    if (lstat(path.c_str(), &status) != 0) {
+        const auto above = path.substr(0, path.rfind('/') + 1);
+        return errno != ENOENT || access(above.c_str(), W_OK) != 0 ? std::strerror(errno) : "";
+    }
+    if (!S_ISDIR(status.st_mode)) return "is no directory";
+    if (!IsOurs(status)) return "belongs to user " + std::to_string(status.st_uid);
+    return IsOursAlone(status) ? "" : "is open to others, or closed to you";
 }
 
 bool IsPortName(const std::string& name) {

@@ -14,6 +14,10 @@ std::string DefaultPortDirectory();
 /// to `at`.
 Descriptor OpenPrivateDirectory(int at, const std::string& path);
 
+/// What keeps `OpenPrivateDirectory` from opening what stands there; empty when nothing does, or nothing
+/// stands there.
+std::string PrivateDirectoryFault(const std::string& path);
+
 /// Whether ports and notices may have that name: it becomes a file's.
 bool IsPortName(const std::string& name);
 

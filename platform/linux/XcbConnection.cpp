@@ -31,6 +31,17 @@ xcb_atom_t XcbAtom(xcb_connection_t* connection, const char* name) {
     return reply ? known.emplace(name, reply->atom).first->second : xcb_atom_t{XCB_ATOM_NONE};
 }
 
+xcb_window_t XcbWindowNamedByRoot(const char* property) {
+    auto* c = XcbConnection();
+    if (!c) return XCB_WINDOW_NONE;
+    const auto cookie = xcb_get_property(c, 0, XcbRootWindow(c), XcbAtom(c, property), XCB_ATOM_WINDOW, 0, 1);
+    const XcbReply<xcb_get_property_reply_t> reply(xcb_get_property_reply(c, cookie, nullptr));
+    xcb_window_t window = XCB_WINDOW_NONE;
+    if (reply && xcb_get_property_value_length(reply.get()) >= static_cast<int>(sizeof window))
+        std::memcpy(&window, xcb_get_property_value(reply.get()), sizeof window);
+    return window;
+}
+
 void XcbSendToRoot(xcb_connection_t* connection, xcb_window_t window, const char* type,
                    const std::array<std::uint32_t, 5>& data) {
     xcb_client_message_event_t event{};

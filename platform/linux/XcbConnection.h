@@ -21,6 +21,8 @@ using XcbReply = std::unique_ptr<T, XcbFreed>;
 xcb_connection_t* XcbConnection();
 xcb_window_t XcbRootWindow(xcb_connection_t* connection);
 xcb_atom_t XcbAtom(xcb_connection_t* connection, const char* name);
+/// The window that the property of the root window names; 0 for none.
+xcb_window_t XcbWindowNamedByRoot(const char* property);
 /// Sends what a window manager listens for, about `window`.
 void XcbSendToRoot(xcb_connection_t* connection, xcb_window_t window, const char* type,
                    const std::array<std::uint32_t, 5>& data);

@@ -7,7 +7,7 @@
 #include <QWindow>
 #include <algorithm>
 #include <cstdint>
-#include <cstring>
+#include <memory>
 #include <optional>
 #include <xcb/xcb.h>
 #include <xcb/xinput.h>
@@ -18,6 +18,28 @@ namespace platform {
 namespace {
 
 constexpr const char* blurBehind = "_KDE_NET_WM_BLUR_BEHIND_REGION";
+
+class TypingHold final : public Handle {
+public:
+    TypingHold() {
+        if (!m_connection) return;
+        // Refused while somebody else has it, as a window manager during its shortcuts: then we go without.
+        const auto cookie = xcb_grab_keyboard(m_connection, 0, XcbRootWindow(m_connection), XCB_CURRENT_TIME,
+                                              XCB_GRAB_MODE_ASYNC, XCB_GRAB_MODE_SYNC);
+        const XcbReply<xcb_grab_keyboard_reply_t> reply(
+            xcb_grab_keyboard_reply(m_connection, cookie, nullptr));
+    }
+    ~TypingHold() override {
+        if (!m_connection) return;
+        xcb_ungrab_keyboard(m_connection, XCB_CURRENT_TIME);
+        xcb_flush(m_connection);
+    }
+    TypingHold(const TypingHold&) = delete;
+    TypingHold& operator=(const TypingHold&) = delete;
+
+private:
+    xcb_connection_t* m_connection = XcbConnection();
+};
 
 } // namespace
 
@@ -63,15 +85,7 @@ bool XcbHidesOtherWindows() {
 }
 
 std::uint32_t XcbActiveWindow() {
-    auto* c = XcbConnection();
-    if (!c) return 0;
-    const auto cookie =
-        xcb_get_property(c, 0, XcbRootWindow(c), XcbAtom(c, "_NET_ACTIVE_WINDOW"), XCB_ATOM_WINDOW, 0, 1);
-    const XcbReply<xcb_get_property_reply_t> reply(xcb_get_property_reply(c, cookie, nullptr));
-    if (!reply || xcb_get_property_value_length(reply.get()) < 4) return 0;
-    std::uint32_t window = 0;
-    std::memcpy(&window, xcb_get_property_value(reply.get()), sizeof window);
-    return window;
+    return XcbWindowNamedByRoot("_NET_ACTIVE_WINDOW");
 }
 
 bool XcbHasInputFocus(std::uint32_t window) {
@@ -94,6 +108,10 @@ void XcbTakeInputFocus(std::uint32_t window) {
     if (!c) return;
     xcb_set_input_focus(c, XCB_INPUT_FOCUS_PARENT, window, XCB_CURRENT_TIME);
     xcb_flush(c);
+}
+
+std::unique_ptr<Handle> XcbHoldTyping() {
+    return std::make_unique<TypingHold>();
 }
 
 void XcbActivateWindow(std::uint32_t window) {

@@ -1,6 +1,9 @@
 #pragma once
 
+#include "platform/MainLoop.h"
+
 #include <cstdint>
+#include <memory>
 #include <optional>
 
 /// What a panel needs of the X server beyond the toolkit. Everything does nothing without one.
@@ -22,6 +25,9 @@ bool XcbHasInputFocus(std::uint32_t window);
 /// Whether any visible window of this process has the keyboard.
 bool XcbHasInputFocus();
 void XcbTakeInputFocus(std::uint32_t window);
+/// Until the handle ends no key event reaches any program; then those that wait go to the window that has the
+/// keyboard. For moments only.
+std::unique_ptr<Handle> XcbHoldTyping();
 /// Asks the window manager to make the window active again.
 void XcbActivateWindow(std::uint32_t window);
 

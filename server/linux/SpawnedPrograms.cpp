@@ -25,7 +25,7 @@ std::optional<int> SpawnedPrograms::start(const std::string& path) {
     return std::nullopt;
 }
 
-std::string SpawnedPrograms::reap(int pid) {
+std::optional<std::string> SpawnedPrograms::reap(int pid) {
     int status = 0;
     pid_t reaped = 0;
     do
@@ -33,6 +33,7 @@ std::string SpawnedPrograms::reap(int pid) {
     while (reaped < 0 && errno == EINTR);
     if (reaped != pid) return std::strerror(errno);
     if (WIFSIGNALED(status)) return std::string("signal ") + std::to_string(WTERMSIG(status));
+    if (WEXITSTATUS(status) == 0) return std::nullopt;
     return "exit code " + std::to_string(WEXITSTATUS(status));
 }
 

@@ -8,7 +8,7 @@ namespace tessel {
 class SpawnedPrograms final : public ProgramStarter {
 public:
     std::optional<int> start(const std::string& path) override;
-    std::string reap(int pid) override;
+    std::optional<std::string> reap(int pid) override;
 };
 
 } // namespace tessel

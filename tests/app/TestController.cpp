@@ -100,6 +100,7 @@ protected:
                 window = made.get();
                 return made;
             },
+        .holdTyping = [] { return nullptr; },
         .terminate = [this] { record.emplace_back("end the agent"); },
     }};
 };

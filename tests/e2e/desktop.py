@@ -57,11 +57,10 @@ def press(key):
 
 
 class Picture:
-    """The screen as it is now."""
+    """The screen as it is now; of another display with another command that writes it as PPM."""
 
-    def __init__(self):
-        raw = subprocess.run(["import", "-window", "root", "-depth", "8", "-type", "TrueColor", "ppm:-"],
-                             capture_output=True, check=True).stdout
+    def __init__(self, command=("import", "-window", "root", "-depth", "8", "-type", "TrueColor", "ppm:-")):
+        raw = subprocess.run(command, capture_output=True, check=True).stdout
         header = re.match(rb"P6\s+(\d+)\s+(\d+)\s+255\s", raw)
         self.width, self.height = int(header[1]), int(header[2])
         self.pixels = raw[header.end():]

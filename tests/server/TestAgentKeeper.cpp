@@ -21,9 +21,9 @@ struct Session : ProgramStarter {
         started.push_back(lastPid);
         return lastPid;
     }
-    std::string reap(int pid) override {
+    std::optional<std::string> reap(int pid) override {
         reaped.push_back(pid);
-        return "exit code 0";
+        return fault;
     }
 
     InMemoryProcessTable processes;
@@ -31,6 +31,7 @@ struct Session : ProgramStarter {
     InMemoryPortNetwork network;
     InMemoryPorts ports{network, loop, {1000, processes.currentProcess()}};
     bool canStart = true;
+    std::optional<std::string> fault = "signal 9";
     int lastPid = 2000;
     platform::ProcessSerialNumber agent;
     std::vector<int> started;
@@ -56,8 +57,10 @@ TEST(AgentKeeper, StartsTheAgentAgainWithGrowingPatience) {
     EXPECT_EQ(session.started.size(), 2u) << "it ended soon: the wait doubles";
     session.loop.advance(1ms);
     EXPECT_EQ(session.started.size(), 3u);
-    session.keeper.reset();
-    EXPECT_FALSE(session.processes.info(session.agent)) << "it ends with its daemon";
+    session.fault.reset();
+    session.processes.end(session.agent);
+    session.loop.advance(60s);
+    EXPECT_EQ(session.started.size(), 3u) << "it was asked to end";
 
     EXPECT_EQ(RestartDelay(40s, 1s), 60s);
     EXPECT_EQ(RestartDelay(60s, 9s), 60s);
@@ -71,6 +74,8 @@ TEST(AgentKeeper, KeepsTryingWhenItCannotBeStarted) {
     session.canStart = true;
     session.loop.advance(250ms);
     EXPECT_THAT(session.started, ElementsAre(2001));
+    session.keeper.reset();
+    EXPECT_FALSE(session.processes.info(session.agent)) << "it ends with its daemon";
 }
 
 TEST(AgentKeeper, KeepsTheAgentThatAKilledDaemonLeft) {

@@ -121,6 +121,7 @@ int main(int count, char* words[]) {
         std::cout << "kxipc " KX_VERSION "\n";
         return 0;
     default:
+        RotateLargeLogFile();
         return run(*arguments);
     }
 }

@@ -4,6 +4,7 @@
 #include <cerrno>
 #include <chrono>
 #include <cstdarg>
+#include <cstdint>
 #include <cstdio>
 #include <cstdlib>
 #include <ctime>
@@ -99,4 +100,11 @@ void RotateLogFiles() {
     fs::remove(LogFilePath(3), ignored);
     for (int index = 2; index >= 0; --index)
         fs::rename(LogFilePath(index), LogFilePath(index + 1), ignored);
+}
+
+void RotateLargeLogFile() {
+    constexpr std::uintmax_t large = 1 << 20;
+    std::error_code error;
+    const auto size = fs::file_size(LogFilePath(0), error);
+    if (!error && size >= large) RotateLogFiles();
 }

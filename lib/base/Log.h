@@ -20,3 +20,6 @@ std::string LogFilePath(int index);
 
 /// Shifts the kept files by one; at most four remain. Once per start, before the first entry.
 void RotateLogFiles();
+
+/// The same, but only when the current file has become large: for programs that start often and log little.
+void RotateLargeLogFile();

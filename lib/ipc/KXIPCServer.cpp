@@ -48,6 +48,8 @@ std::string KXIPCServer::portName() const {
 
 void KXIPCServer::setAllowIncomingMessages(bool allow) {
     KXIPCCommon::setAllowIncomingMessages(allow);
+    // Another has the name: its clients would be told that it had started anew.
+    if (allow && !isReachable()) return;
     context().notifications.post(allowIncomingMessages() ? KX_IPC_SERVER_DID_LAUNCH_NOTIFICATION
                                                          : KX_IPC_SERVER_DID_TERMINATE_NOTIFICATION);
 }

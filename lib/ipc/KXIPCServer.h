@@ -14,7 +14,7 @@ public:
     explicit KXIPCServer(KXIPCContext& context);
 
     std::string portName() const override;
-    /// Broadcasts on every call whether the server is there now.
+    /// Broadcasts on every call whether the server is there now; nothing when it lost the race for its name.
     void setAllowIncomingMessages(bool allow) override;
     /// Synchronously: waits for each client before the next is sent to.
     void postMessage(const KXIPCMessage& message, bool synchronously) override;

@@ -77,6 +77,16 @@ TEST(Log, RotationShiftsByOneForgetsTheOldestAndKeepsGaps) {
     }
 }
 
+TEST(Log, OfAProgramThatStartsOftenRotatesWhenItIsLarge) {
+    const ScratchHome home;
+    for (const std::size_t size : {1000, 1 << 20}) {
+        EXPECT_FALSE(fs::exists(LogFilePath(1)));
+        put(LogFilePath(0), std::string(size, 'x'));
+        RotateLargeLogFile();
+    }
+    EXPECT_TRUE(fs::exists(LogFilePath(1)) && !fs::exists(LogFilePath(0)));
+}
+
 TEST(CheckedMalloc, PanicsOnlyWhenThereIsNoMemory) {
     const ScratchHome home;
     std::free(CheckedMalloc(-1, 0, "file", 1));

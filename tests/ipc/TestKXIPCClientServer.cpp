@@ -144,6 +144,21 @@ TEST_F(KXIPCClientServerTest, AClientFollowsItsServersEndAndTheNextOne) {
     startServer();
     ASSERT_TRUE(world.loop.runUntil(isRegistered));
 
+    // One that comes too late tells nobody that a server was started.
+    std::vector<std::string> notices;
+    const auto note = [&](const char* name) {
+        return clientPeer.notices.observe(name, [&notices, name] { notices.emplace_back(name); });
+    };
+    other.notices.post("earlier");
+    const auto earlier = note("earlier"), launch = note(KX_IPC_SERVER_DID_LAUNCH_NOTIFICATION);
+    ASSERT_TRUE(world.loop.runUntil([&] { return !notices.empty() && notices.back() == "earlier"; }));
+    notices.clear();
+    const auto later = note("later");
+    KXIPCServer(other.context).setAllowIncomingMessages(true);
+    other.notices.post("later");
+    ASSERT_TRUE(world.loop.runUntil([&] { return !notices.empty(); }));
+    EXPECT_THAT(notices, ElementsAre("later"));
+
     // Killed; a new one has the name before the client's main loop turns again, and its launch notice is
     // lost.
     server.reset();

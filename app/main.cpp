@@ -4,7 +4,6 @@
 #include "app/SMMenuWindowForm.h"
 #include "app/SMMenuWindowOwner.h"
 #include "app/SMOptions.h"
-#include "app/SMTranslation.h"
 #include "app/doctorReport.h"
 #include "lib/base/ExceptionLogging.h"
 #include "lib/base/Log.h"
@@ -25,6 +24,7 @@
 #include "platform/linux/ProcProcessTable.h"
 #include "platform/linux/QtMainLoop.h"
 #include "platform/linux/QtModifierKeys.h"
+#include "platform/linux/QtTranslations.h"
 #include "platform/linux/QtWindowServer.h"
 #include "platform/linux/StripStatusBar.h"
 #include "platform/linux/SystemClock.h"
@@ -171,7 +171,7 @@ int run(int argc, char* argv[]) {
     QCoreApplication::setApplicationName(programName);
     QGuiApplication::setDesktopFileName(bundleIdentifier);
     QGuiApplication::setQuitOnLastWindowClosed(false);
-    SMLoadTranslations();
+    platform::LoadTranslations(QStringLiteral("tesselStartMenu"));
     Agent agent;
     return agent.start() ? QCoreApplication::exec() : fail(another);
 }

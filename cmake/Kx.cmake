@@ -68,3 +68,10 @@ function(kx_test name)
     set_tests_properties(${name} PROPERTIES TIMEOUT 120 ENVIRONMENT
         "QT_QPA_PLATFORM=offscreen;ASAN_OPTIONS=detect_leaks=${leaks};KX_TEST_BIN=${CMAKE_BINARY_DIR}/bin")
 endfunction()
+
+# kx_translations(target name): the texts of the folder in each language, from translations/<name>_<language>.ts.
+function(kx_translations target name)
+    set(languages ar de en es fr ja zh)
+    list(TRANSFORM languages REPLACE "(.+)" "translations/${name}_\\1.ts" OUTPUT_VARIABLE files)
+    qt_add_translations(${target} TS_FILES ${files} RESOURCE_PREFIX /i18n)
+endfunction()

@@ -6,11 +6,13 @@
 #include "platform/linux/PrivateDirectory.h"
 #include "platform/linux/ProcProcessTable.h"
 #include "platform/linux/QtMainLoop.h"
+#include "platform/linux/QtTranslations.h"
 #include "platform/linux/SystemClock.h"
 #include "platform/linux/TerminationSignals.h"
 #include "server/AgentKeeper.h"
 #include "server/Options.h"
 #include "server/StartMenuServer.h"
+#include "server/Texts.h"
 #include "server/Worker.h"
 #include "server/catalogues/Machine.h"
 #include "server/catalogues/SampleMachine.h"
@@ -19,6 +21,7 @@
 #include "server/linux/SpawnedPrograms.h"
 
 #include <QGuiApplication>
+#include <QtGlobal>
 
 #include <algorithm>
 #include <cstdio>
@@ -41,7 +44,8 @@ constexpr const char* agentName = "corvane-tesselStartMenu";
 /// The machines that there are without a configuration.
 std::vector<std::unique_ptr<Machine>> MakeMachines(const std::string& prefix) {
     std::vector<std::unique_ptr<Machine>> machines;
-    machines.push_back(std::make_unique<HostMachine>("host", "This computer"));
+    machines.push_back(
+        std::make_unique<HostMachine>("host", Localized(QT_TRANSLATE_NOOP("tesselDaemon", "This computer"))));
     if (auto sample = SampleMachine::open("sample", prefix + "/share/corvane-tessel/sample"))
         machines.push_back(std::move(sample));
     return machines;
@@ -140,6 +144,7 @@ int Run(const Options& options) {
     char* arguments[] = {name, option, platform, nullptr};
     int count = 3;
     const QGuiApplication application(count, arguments);
+    platform::LoadTranslations(QStringLiteral("tesselDaemon"));
     Daemon daemon(options);
     return daemon.start() ? QCoreApplication::exec() : EXIT_FAILURE;
 }

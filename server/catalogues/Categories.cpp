@@ -1,5 +1,6 @@
 #include "server/catalogues/Categories.h"
 
+#include <QtGlobal>
 #include <algorithm>
 #include <array>
 #include <cstddef>
@@ -9,21 +10,23 @@ namespace tessel {
 namespace {
 
 constexpr std::array folders{
-    ProgramFolder{"AudioVideo", "Sound & Video", "applications-multimedia"},
-    ProgramFolder{"Audio", "Sound & Video", "applications-multimedia"},
-    ProgramFolder{"Video", "Sound & Video", "applications-multimedia"},
-    ProgramFolder{"Development", "Development", "applications-development"},
-    ProgramFolder{"Education", "Education", "applications-education"},
-    ProgramFolder{"Game", "Games", "applications-games"},
-    ProgramFolder{"Graphics", "Graphics", "applications-graphics"},
-    ProgramFolder{"Network", "Internet", "applications-internet"},
-    ProgramFolder{"Office", "Office", "applications-office"},
-    ProgramFolder{"Science", "Science", "applications-science"},
-    ProgramFolder{"Settings", "Settings", "preferences-system"},
-    ProgramFolder{"System", "System Tools", "applications-system"},
-    ProgramFolder{"Utility", "Accessories", "applications-utilities"},
+    ProgramFolder{"AudioVideo", QT_TRANSLATE_NOOP("tesselDaemon", "Sound & Video"),
+                  "applications-multimedia"},
+    ProgramFolder{"Audio", QT_TRANSLATE_NOOP("tesselDaemon", "Sound & Video"), "applications-multimedia"},
+    ProgramFolder{"Video", QT_TRANSLATE_NOOP("tesselDaemon", "Sound & Video"), "applications-multimedia"},
+    ProgramFolder{"Development", QT_TRANSLATE_NOOP("tesselDaemon", "Development"),
+                  "applications-development"},
+    ProgramFolder{"Education", QT_TRANSLATE_NOOP("tesselDaemon", "Education"), "applications-education"},
+    ProgramFolder{"Game", QT_TRANSLATE_NOOP("tesselDaemon", "Games"), "applications-games"},
+    ProgramFolder{"Graphics", QT_TRANSLATE_NOOP("tesselDaemon", "Graphics"), "applications-graphics"},
+    ProgramFolder{"Network", QT_TRANSLATE_NOOP("tesselDaemon", "Internet"), "applications-internet"},
+    ProgramFolder{"Office", QT_TRANSLATE_NOOP("tesselDaemon", "Office"), "applications-office"},
+    ProgramFolder{"Science", QT_TRANSLATE_NOOP("tesselDaemon", "Science"), "applications-science"},
+    ProgramFolder{"Settings", QT_TRANSLATE_NOOP("tesselDaemon", "Settings"), "preferences-system"},
+    ProgramFolder{"System", QT_TRANSLATE_NOOP("tesselDaemon", "System Tools"), "applications-system"},
+    ProgramFolder{"Utility", QT_TRANSLATE_NOOP("tesselDaemon", "Accessories"), "applications-utilities"},
 };
-constexpr ProgramFolder otherFolder{"", "Other", "applications-other"};
+constexpr ProgramFolder otherFolder{"", QT_TRANSLATE_NOOP("tesselDaemon", "Other"), "applications-other"};
 
 } // namespace
 

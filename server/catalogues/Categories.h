@@ -7,7 +7,7 @@ namespace tessel {
 /// A folder of the tree of programs, for one of the main categories of desktop entries.
 struct ProgramFolder {
     std::string_view category;
-    std::string_view title;
+    const char* title; ///< English, to be localised
     std::string_view icon;
 };
 

@@ -1,5 +1,6 @@
 #include "server/linux/HostCatalogue.h"
 
+#include "server/Texts.h"
 #include "server/catalogues/Catalogue.h"
 #include "server/catalogues/Categories.h"
 #include "server/linux/GObjectPointer.h"
@@ -7,6 +8,7 @@
 #include <cstddef>
 #include <gio/gdesktopappinfo.h>
 
+#include <QtGlobal>
 #include <algorithm>
 #include <filesystem>
 #include <gio/gio.h>
@@ -76,15 +78,20 @@ std::vector<Entry> ReadEntries() {
     return entries;
 }
 
+std::string FolderId(const ProgramFolder& folder) {
+    return std::string("folder:") + folder.title;
+}
+
 std::vector<CatalogueItem> FoldersOf(const std::vector<Entry>& entries) {
     std::vector<CatalogueItem> folders;
     for (const Entry& entry : entries) {
         const ProgramFolder& folder = FolderForCategories(entry.categories);
-        auto found = std::ranges::find(folders, folder.title, &CatalogueItem::title);
+        const std::string id = FolderId(folder);
+        auto found = std::ranges::find(folders, id, &CatalogueItem::id);
         if (found == folders.end())
             found = folders.insert(folders.end(), {.kind = ItemKind::folder,
-                                                   .id = "folder:" + std::string(folder.title),
-                                                   .title = std::string(folder.title),
+                                                   .id = id,
+                                                   .title = Localized(folder.title),
                                                    .icon = std::string(folder.icon)});
         found->children.push_back(entry.item);
     }
@@ -98,7 +105,7 @@ std::optional<CatalogueItem> Place(const std::string& path, const char* title, c
     const GObjectPointer<GFile> file(g_file_new_for_path(path.c_str()));
     return CatalogueItem{.kind = ItemKind::command,
                          .id = std::string(placePrefix) + TakeString(g_file_get_uri(file.get())),
-                         .title = title ? title : std::filesystem::path(path).filename().string(),
+                         .title = title ? Localized(title) : std::filesystem::path(path).filename().string(),
                          .icon = icon};
 }
 
@@ -129,16 +136,21 @@ void AddSpecialFolders(std::span<const SpecialFolder> folders, std::vector<Catal
 
 std::vector<CatalogueItem> TopMenu(const std::vector<CatalogueItem>& programs) {
     std::vector<CatalogueItem> items;
-    if (auto home = Place(g_get_home_dir(), "Home", "user-home")) items.push_back(std::move(*home));
+    if (auto home = Place(g_get_home_dir(), QT_TRANSLATE_NOOP("tesselDaemon", "Home"), "user-home"))
+        items.push_back(std::move(*home));
     AddSpecialFolders(mainFolders, items);
 
-    CatalogueItem places{.kind = ItemKind::folder, .id = "folder:/", .title = "Places", .icon = "folder"};
+    CatalogueItem places{.kind = ItemKind::folder,
+                         .id = "folder:/",
+                         .title = Localized(QT_TRANSLATE_NOOP("tesselDaemon", "Places")),
+                         .icon = "folder"};
     AddSpecialFolders(otherFolders, places.children);
-    if (auto root = Place("/", "File System", "drive-harddisk")) places.children.push_back(std::move(*root));
+    if (auto root = Place("/", QT_TRANSLATE_NOOP("tesselDaemon", "File System"), "drive-harddisk"))
+        places.children.push_back(std::move(*root));
     items.push_back(std::move(places));
 
     const auto settings =
-        std::ranges::find(programs, FolderForCategories("Settings").title, &CatalogueItem::title);
+        std::ranges::find(programs, FolderId(FolderForCategories("Settings")), &CatalogueItem::id);
     if (settings != programs.end()) {
         items.push_back({.kind = ItemKind::separator});
         items.push_back(*settings);

@@ -1,5 +1,5 @@
 #!/usr/bin/env python3
-"""Every text of the agent is translated, in every language: compares the sources with the translations as the
+"""Every text of the programs is translated, in every language: compares the sources with the translations as the
 translators' own tool does, on copies."""
 
 import pathlib
@@ -15,12 +15,18 @@ LUPDATE = sys.argv.pop()
 
 
 class Translations(unittest.TestCase):
-    def test_no_text_is_unfinished(self):
-        files = sorted((ROOT / "app/translations").glob("*.ts"))
+    def test_no_text_of_the_agent_is_unfinished(self):
+        self.check("app")
+
+    def test_no_text_of_the_daemon_is_unfinished(self):
+        self.check("server")
+
+    def check(self, sources):
+        files = sorted((ROOT / sources / "translations").glob("*.ts"))
         self.assertEqual([file.stem.split("_")[1] for file in files], ["ar", "de", "en", "es", "fr", "ja", "zh"])
         with tempfile.TemporaryDirectory() as folder:
             copies = [shutil.copy(file, folder) for file in files]
-            subprocess.run([LUPDATE, "-silent", "-locations", "none", ROOT / "app", "-ts", *copies], check=True,
+            subprocess.run([LUPDATE, "-silent", "-locations", "none", ROOT / sources, "-ts", *copies], check=True,
                            stderr=subprocess.DEVNULL)
             for copy in copies:
                 messages = list(ElementTree.parse(copy).iter("message"))

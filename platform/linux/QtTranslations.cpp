@@ -1,4 +1,4 @@
-#include "app/SMTranslation.h"
+#include "platform/linux/QtTranslations.h"
 
 #include <QGuiApplication>
 #include <QLibraryInfo>
@@ -6,6 +6,7 @@
 #include <QTranslator>
 #include <memory>
 
+namespace platform {
 namespace {
 
 bool install(const QLocale& locale, const QString& name, const QString& folder) {
@@ -17,10 +18,9 @@ bool install(const QLocale& locale, const QString& name, const QString& folder) 
 
 } // namespace
 
-void SMLoadTranslations() {
+void LoadTranslations(const QString& name) {
     const QLocale locale;
     const QString ours = QStringLiteral(":/i18n");
-    const QString name = QStringLiteral("tesselStartMenu");
     install(locale, QStringLiteral("qtbase"), QLibraryInfo::path(QLibraryInfo::TranslationsPath));
     // English has plurals to tell apart, too.
     if (!install(locale, name, ours)) install(QLocale(QLocale::English), name, ours);
@@ -29,3 +29,5 @@ void SMLoadTranslations() {
     QGuiApplication::setLayoutDirection(
         (languages.isEmpty() ? locale : QLocale(languages.first())).textDirection());
 }
+
+} // namespace platform

@@ -29,7 +29,9 @@ float placeUpwards(const KXRect& wanted, const KXRect& item, const KXRect& avail
 } // namespace
 
 KXRect PlacePanel(const KXRect& wanted, const KXRect& item, const KXRect& available, bool rightToLeft) {
-    if (item.width <= 0) return wanted;
+    if (item.width <= 0)
+        return {rightToLeft ? available.minX() : available.maxX() - wanted.width,
+                available.maxY() - wanted.height, wanted.width, wanted.height};
     return {placeAcross(wanted, item, available, rightToLeft), placeUpwards(wanted, item, available),
             wanted.width, wanted.height};
 }

@@ -10,7 +10,7 @@ namespace platform {
 /// Where a panel goes that is wanted at `wanted`: right below `item`, its right edge one point past the
 /// item's. Exactly there, if that is in `available`; that one point may leave it. Else mirrored at the item:
 /// above it, or with the left edges together; else shifted in. Right to left, the left edges come first.
-/// Without an item (no width) nothing is changed.
+/// As long as the item has no place (no width): in the upper corner where bars have their items.
 KXRect PlacePanel(const KXRect& wanted, const KXRect& item, const KXRect& available, bool rightToLeft);
 
 /// The frame of an item whose host tells only where it was clicked. An item in a bar, which is what

@@ -13,7 +13,6 @@ KXRect hanging(const KXRect& item, float width = 480, float height = 500) {
 }
 
 TEST(PanelPlacement, MovesThePanelOnlyFromWhereThereIsNoRoom) {
-    const KXRect screen{0, 0, 1280, 800};
     const struct {
         const char* what;
         KXRect item, available;
@@ -42,8 +41,9 @@ TEST(PanelPlacement, MovesThePanelOnlyFromWhereThereIsNoRoom) {
         const KXRect placed = PlacePanel(hanging(c.item), c.item, c.available, c.rightToLeft);
         EXPECT_EQ(placed, (KXRect{c.placed.x, c.placed.y, 480, 500})) << c.what;
     }
-    EXPECT_EQ(PlacePanel({5000, -900, 480, 500}, {}, screen, false), (KXRect{5000, -900, 480, 500}))
-        << "without an item there is nothing to go by";
+    const KXRect nowhere{-479, -500, 480, 500};
+    EXPECT_EQ(PlacePanel(nowhere, {}, {0, 0, 1280, 776}, false), (KXRect{800, 276, 480, 500}));
+    EXPECT_EQ(PlacePanel(nowhere, {}, {0, 0, 1280, 776}, true), (KXRect{0, 276, 480, 500}));
 }
 
 TEST(PanelPlacement, GuessesTheItemsFrameFromItsClick) {

@@ -40,8 +40,10 @@ class LocalPort {
 public:
     virtual ~LocalPort() = default; ///< closes; no thread may be in `run` any more
 
-    /// Hands arrivals to `receiver` on the calling thread, one at a time, until `close`.
-    virtual void run(const std::function<void(Arrival)>& receiver) = 0;
+    /// Hands arrivals to `receiver` on the calling thread until `close`: in order, and those together that
+    /// were there together. Never none.
+    using Receiver = std::function<void(std::vector<Arrival>)>;
+    virtual void run(const Receiver& receiver) = 0;
 
     /// Gives the name up at once, so that nobody reaches the port when this returns, and makes `run` return
     /// soon. What was not handed over is dropped; receipts that are still held answer when they end. Any
@@ -53,6 +55,7 @@ enum class SendStatus : int {
     success = 0,
     sendTimeout = -1,
     receiveTimeout = -2,
+    isInvalid = -3, ///< nobody listens any more
     transportError = -4,
     becameInvalid = -5, ///< the receiver went away before it had answered
 };

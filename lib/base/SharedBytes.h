@@ -17,7 +17,7 @@ public:
 
     /// A private copy of `size` bytes at `data`.
     static SharedBytes copyOf(const void* data, std::size_t size) {
-        auto buffer = std::make_shared<std::byte[]>(size);
+        auto buffer = std::make_shared_for_overwrite<std::byte[]>(size);
         if (size > 0) std::memcpy(buffer.get(), data, size);
         return {{buffer.get(), size}, buffer};
     }

@@ -29,13 +29,16 @@ void KXIPCCommon::setAllowIncomingMessages(bool allow) {
 }
 
 KXIPCCommon::Observer* KXIPCCommon::find(const void* token) {
-    const auto found = std::ranges::find(m_observerTable, token, &Observer::token);
-    return found == m_observerTable.end() ? nullptr : &*found;
+    const auto found = m_places.find(token);
+    return found == m_places.end() ? nullptr : &m_observerTable[found->second];
 }
 
 void KXIPCCommon::addEntries(const KXIPCObserverEntry::Array& entries, const void* observer) {
     auto* known = find(observer);
-    if (!known) known = &m_observerTable.emplace_back(Observer{observer, {}});
+    if (!known) {
+        m_places.emplace(observer, m_observerTable.size());
+        known = &m_observerTable.emplace_back(Observer{observer, {}});
+    }
     known->entries.insert(known->entries.end(), entries.begin(), entries.end());
 }
 
@@ -115,6 +118,7 @@ void KXIPCCommon::onRemoteMessageReceived(const plist::Value& envelope) {
 void KXIPCCommon::terminateWithDelegate(std::function<void()> selector) {
     m_terminateSelector = std::move(selector);
     m_observerTable.clear();
+    m_places.clear();
     ++m_removals;
     // A port that could not be opened has had its end notice, and no other will come.
     const bool isNoticeToCome = m_messageReceiver.willTerminate();

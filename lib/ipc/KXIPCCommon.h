@@ -6,6 +6,7 @@
 #include "lib/ipc/KXIPCMessageReceiver.h"
 #include "lib/ipc/KXIPCObserverEntry.h"
 
+#include <cstddef>
 #include <cstdint>
 #include <functional>
 #include <string>
@@ -62,7 +63,8 @@ private:
     void dispatch(const KXIPCMessage& message, const void* token);
 
     KXIPCContext& m_context;
-    std::vector<Observer> m_observerTable;
+    std::vector<Observer> m_observerTable;                 ///< only ever grows, or is emptied as a whole
+    std::unordered_map<const void*, std::size_t> m_places; ///< in the table, by token
     std::uint64_t m_removals = 0; ///< tells a dispatch under way whether to look again before it calls
     std::unordered_map<std::uint64_t, std::int32_t> m_lastMessageIDs; ///< by sender
     LogLimit m_logLimit;

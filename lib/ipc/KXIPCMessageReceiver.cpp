@@ -7,8 +7,10 @@
 #include "lib/plist/Value.h"
 #include "platform/MessagePort.h"
 
+#include <algorithm>
 #include <chrono>
 #include <deque>
+#include <iterator>
 #include <memory>
 #include <mutex>
 #include <optional>
@@ -18,8 +20,8 @@
 #include <utility>
 #include <vector>
 
-/// One port from start to end notice. What arrived waits in an inbox here, and each task posted to the main
-/// loop takes one thing out: so all of it goes when the worker goes, whatever is still posted.
+/// One port from start to end notice. What arrived waits in an inbox here; a task posted to the main loop
+/// takes one thing out, and posts the next: so all of it goes when the worker goes, whatever is still posted.
 class KXIPCMessageReceiver::Worker : public std::enable_shared_from_this<Worker> {
 public:
     explicit Worker(KXIPCMessageReceiver& receiver)
@@ -31,7 +33,7 @@ public:
         if (m_port && startThread()) return;
         m_port.reset();
         Log("%s, listening for messages failed\n", "-[KXIPCMessageReceiver workerThreadStartReceiving:]");
-        forward({});
+        forwardEnd();
     }
 
     void close() {
@@ -64,17 +66,23 @@ private:
     }
 
     void workerThreadStartReceiving() {
-        m_port->run([this](platform::Arrival arrival) { WorkerThreadOnMessageReceived(std::move(arrival)); });
-        forward({});
+        m_port->run([this](std::vector<platform::Arrival> arrivals) {
+            std::vector<Delivery> group;
+            for (auto& arrival : arrivals)
+                WorkerThreadOnMessageReceived(arrival, group);
+            forward(std::move(group));
+            // Now the receipts of what was dropped end: no answer overtakes what came before.
+        });
+        forwardEnd();
     }
 
-    void WorkerThreadOnMessageReceived(platform::Arrival arrival) {
+    void WorkerThreadOnMessageReceived(platform::Arrival& arrival, std::vector<Delivery>& group) {
         constexpr auto routine = "WorkerThreadOnMessageReceived";
         std::string error;
         auto envelope = plist::Parse(arrival.bytes, error);
         if (error.empty()) error = KXIPCEnvelopeError(envelope);
         if (error.empty() && KXIPCEnvelopeIsFrom(envelope, arrival.sender)) {
-            forward({std::move(envelope), std::move(arrival.receipt)});
+            group.push_back({std::move(envelope), std::move(arrival.receipt)});
             return;
         }
         if (!m_logLimit.allows(arrival.sender.processID, std::chrono::steady_clock::now())) return;
@@ -85,11 +93,22 @@ private:
             Log("IPC: %s: unable to parse remote message. Error: %s\n", routine, error.c_str());
     }
 
-    void forward(Delivery delivery) {
+    void forwardEnd() {
+        std::vector<Delivery> end(1);
+        forward(std::move(end));
+    }
+
+    void forward(std::vector<Delivery> group) {
+        if (group.empty()) return;
         {
             const std::lock_guard lock(m_mutex);
-            m_inbox.push_back(std::move(delivery));
+            std::ranges::move(group, std::back_inserter(m_inbox));
+            if (std::exchange(m_isPosted, true)) return;
         }
+        postDelivery();
+    }
+
+    void postDelivery() {
         m_mainLoop.post([weak = weak_from_this()] {
             if (const auto worker = weak.lock()) worker->deliver();
         });
@@ -97,9 +116,12 @@ private:
 
     std::optional<Delivery> takeDelivery() {
         const std::lock_guard lock(m_mutex);
+        m_isPosted = m_inbox.size() > 1;
         if (m_inbox.empty()) return std::nullopt;
         auto delivery = std::move(m_inbox.front());
         m_inbox.pop_front();
+        // Before this one is handled: its handler may turn the loop.
+        if (m_isPosted) postDelivery();
         return delivery;
     }
 
@@ -125,6 +147,7 @@ private:
     LogLimit m_logLimit;
     std::mutex m_mutex;
     std::deque<Delivery> m_inbox;
+    bool m_isPosted = false; ///< a task for the first of the inbox
     bool m_hasTerminated = false;
 };
 

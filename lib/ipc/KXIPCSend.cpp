@@ -48,13 +48,12 @@ void KX_IPC_SendMessageToNamedPort(KXIPCContext& context, const KXIPCMessage& me
         Warning("IPC: %s: unable to serialize data\n", routine);
         return;
     }
+    using Status = platform::SendStatus;
     const auto port = context.ports.connect(portName);
-    if (!port) {
+    const auto status = port ? port->send(data.pieces, synchronous, timeouts) : Status::isInvalid;
+    if (status == Status::isInvalid)
         Warning("IPC: %s: unable to create port, dropping message\n", routine);
-        return;
-    }
-    const auto status = port->send(data.pieces, synchronous, timeouts);
-    if (status != platform::SendStatus::success)
+    else if (status != Status::success)
         Warning("IPC: %s: error %d sending message: %s\n", routine, static_cast<int>(status),
                 message.name().value_or("(null)").c_str());
 }

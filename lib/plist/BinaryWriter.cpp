@@ -34,7 +34,13 @@ public:
         : m_objectLimit(std::min<std::size_t>(limits.objects, UINT32_MAX / 2))
         , m_byteLimit(limits.bytes)
         , m_nesting(std::min(limits.nesting, kDeepestNesting))
-        , m_error(error) {}
+        , m_error(error) {
+        // Room for a small message: growing there would take as long as writing.
+        m_out.reserve(512);
+        m_objects.reserve(32);
+        m_references.reserve(32);
+        m_containers.reserve(8);
+    }
 
     Encoded run(const Value& value) {
         m_out.put(std::as_bytes(std::span(std::string_view("bplist00"))));

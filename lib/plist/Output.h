@@ -55,6 +55,7 @@ private:
 /// The bytes of a file, with stretches of it that stand elsewhere.
 class Output {
 public:
+    void reserve(std::size_t size) { m_own.reserve(size); }
     std::size_t size() const { return m_own.size() + m_elsewhere; }
     /// How much was put here, not elsewhere; and what stands there.
     std::size_t mark() const { return m_own.size(); }

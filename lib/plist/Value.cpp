@@ -96,6 +96,15 @@ Dictionary::Dictionary(std::initializer_list<Entry> entries)
 
 Dictionary::Dictionary(std::vector<Entry> entries)
     : m_entries(std::move(entries)) {
+    const auto isRepeated = [&](const Entry& entry) {
+        return std::ranges::count(m_entries, entry.first, &Entry::first) > 1;
+    };
+    const auto isNil = [](const Entry& entry) { return entry.second.isNil(); };
+    constexpr std::size_t few = 8; // compared faster than sorted
+    if (m_entries.size() <= few && std::ranges::none_of(m_entries, isRepeated)) {
+        std::erase_if(m_entries, isNil);
+        return;
+    }
     std::vector<std::size_t> order(m_entries.size());
     std::iota(order.begin(), order.end(), std::size_t{0});
     std::ranges::stable_sort(order, {},
@@ -105,7 +114,7 @@ Dictionary::Dictionary(std::vector<Entry> entries)
         Entry& before = m_entries[order[i - 2]];
         if (last.first == before.first) before.second = std::exchange(last.second, nullptr);
     }
-    std::erase_if(m_entries, [](const Entry& entry) { return entry.second.isNil(); });
+    std::erase_if(m_entries, isNil);
 }
 
 Dictionary& Dictionary::set(std::string key, Value value) {

@@ -11,11 +11,10 @@
 #include <chrono>
 #include <cstddef>
 #include <cstdint>
+#include <fcntl.h>
 #include <memory>
 #include <mutex>
 #include <optional>
-#include <poll.h>
-
 #include <string>
 #include <utility>
 
@@ -33,7 +32,7 @@ SendStatus StatusFrom(Sending sending) {
     case Sending::taken:
         return SendStatus::success;
     case Sending::hungUp:
-        return SendStatus::becameInvalid;
+        return SendStatus::isInvalid;
     default:
         return SendStatus::transportError;
     }
@@ -55,7 +54,7 @@ Destination::Destination(const PortNames& names, const Clock& clock, PortTap& ta
 
 bool Destination::connect() {
     const std::lock_guard lock(m_mutex);
-    drainLocked();
+    // Whether that one has ended, the next message will tell.
     return m_socket || openConnection() != Sending::hungUp;
 }
 
@@ -138,6 +137,8 @@ Sending Destination::openConnection() {
     socklen_t size = sizeof sendBuffer;
     getsockopt(socket.get(), SOL_SOCKET, SO_SNDBUF, &sendBuffer, &size);
     m_inlineLimit = InlineLimit(sendBuffer);
+    // Only connecting must not wait, and whoever reads or writes says whether he does.
+    fcntl(socket.get(), F_SETFL, 0);
     m_socket = std::make_shared<const Descriptor>(std::move(socket));
     m_warned = false;
     m_delegate.didChangeConnection(m_name);
@@ -213,20 +214,26 @@ SendStatus Destination::awaitAnswer(const Socket& socket, std::uint64_t sequence
                                     std::chrono::milliseconds timeout) {
     using std::chrono::steady_clock;
     const auto deadline = steady_clock::now() + timeout;
-    for (;;) {
+    for (auto left = timeout; left.count() > 0;
+         left = std::chrono::ceil<std::chrono::milliseconds>(deadline - steady_clock::now())) {
+        setPatience(socket, left);
         std::uint64_t answered = 0;
-        const auto reading = ReadAnswer(socket->get(), answered);
+        const auto reading = AwaitAnswer(socket->get(), answered);
         if (reading == Reading::packet && answered == sequence) return SendStatus::success;
-        if (reading == Reading::packet) continue; // for one that was not waited for to its end
-        if (reading != Reading::nothing) break;
-        const auto left = std::chrono::ceil<std::chrono::milliseconds>(deadline - steady_clock::now());
-        if (left.count() <= 0) return SendStatus::receiveTimeout;
-        pollfd polled{socket->get(), POLLIN, 0};
-        poll(&polled, 1, static_cast<int>(left.count()));
+        // Another packet answers a message that was not waited for to its end.
+        if (reading == Reading::packet || reading == Reading::nothing) continue;
+        const std::lock_guard lock(m_mutex);
+        if (m_socket == socket) endConnection();
+        return SendStatus::becameInvalid;
     }
-    const std::lock_guard lock(m_mutex);
-    if (m_socket == socket) endConnection();
-    return SendStatus::becameInvalid;
+    return SendStatus::receiveTimeout;
+}
+
+void Destination::setPatience(const Socket& socket, std::chrono::milliseconds time) {
+    if (m_patience == time && m_patient.lock() == socket) return;
+    m_patience = time;
+    m_patient = socket;
+    SetPatience(socket->get(), time);
 }
 
 void Destination::giveUpOverdue() {

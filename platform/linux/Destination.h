@@ -73,6 +73,7 @@ private:
     SendStatus awaitTurn(std::unique_lock<std::mutex>& lock, const std::shared_ptr<Waiting>& waiting,
                          RemotePort::Timeouts timeouts);
     SendStatus awaitAnswer(const Socket& socket, std::uint64_t sequence, std::chrono::milliseconds timeout);
+    void setPatience(const Socket& socket, std::chrono::milliseconds time);
     void giveUpOverdue();
     void countQueued(const OutgoingPacket& packet, bool isAdded);
     void removeFirst();
@@ -85,6 +86,9 @@ private:
     Delegate& m_delegate;
     const std::string m_name;
     std::uint64_t m_sequence = 0; ///< main thread
+    /// How long a socket waits for an answer, and which was told so. Main thread.
+    std::chrono::milliseconds m_patience{};
+    std::weak_ptr<const Descriptor> m_patient;
     std::atomic<std::size_t> m_inlineLimit = maximalInlinePayload;
 
     mutable std::mutex m_mutex; ///< guards what follows; nothing that takes long is done with it

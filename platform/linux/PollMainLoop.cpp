@@ -3,16 +3,19 @@
 #include "platform/MainLoop.h"
 
 #include <chrono>
-#include <cstddef>
+#include <cstdint>
 #include <functional>
 #include <iterator>
+#include <map>
 #include <memory>
 #include <mutex>
 #include <optional>
-#include <poll.h>
+#include <set>
+#include <sys/epoll.h>
 #include <sys/eventfd.h>
 
 #include <algorithm>
+#include <array>
 #include <climits>
 #include <utility>
 #include <vector>
@@ -32,6 +35,45 @@ struct PollMainLoop::Watch {
     bool live = true;
 };
 
+/// Which descriptors are waited for. Two watches may share one.
+class PollMainLoop::Poll {
+public:
+    explicit Poll(int wake) { control(EPOLL_CTL_ADD, wake, EPOLLIN | EPOLLET); }
+
+    void add(int descriptor) {
+        if (++m_watches[descriptor] > 1) return;
+        // Files that cannot be waited for can always be read.
+        if (!control(EPOLL_CTL_ADD, descriptor, EPOLLIN)) m_alwaysReadable.insert(descriptor);
+    }
+    void remove(int descriptor) {
+        if (--m_watches[descriptor] > 0) return;
+        m_watches.erase(descriptor);
+        if (m_alwaysReadable.erase(descriptor) == 0) control(EPOLL_CTL_DEL, descriptor, 0);
+    }
+    /// Waits, and answers what can be read.
+    std::set<int> wait(int timeout) {
+        std::array<epoll_event, 32> events;
+        const int count = epoll_wait(m_epoll.get(), events.data(), static_cast<int>(events.size()),
+                                     m_alwaysReadable.empty() ? timeout : 0);
+        auto readable = m_alwaysReadable;
+        for (int i = 0; i < count; ++i)
+            readable.insert(events[static_cast<std::size_t>(i)].data.fd);
+        return readable;
+    }
+
+private:
+    bool control(int operation, int descriptor, std::uint32_t events) {
+        epoll_event event = {};
+        event.events = events;
+        event.data.fd = descriptor;
+        return epoll_ctl(m_epoll.get(), operation, descriptor, &event) == 0;
+    }
+
+    const Descriptor m_epoll{epoll_create1(EPOLL_CLOEXEC)};
+    std::map<int, int> m_watches; ///< how many, by descriptor
+    std::set<int> m_alwaysReadable;
+};
+
 namespace {
 
 /// The loop lets go of an entry that is no longer live at its next turn: it may be the one that is running.
@@ -48,20 +90,39 @@ private:
     std::shared_ptr<Entry> m_entry;
 };
 
+/// The descriptor may be closed, and its number another's, once the handle has ended.
+template <typename Entry, typename Poll>
+class WatchHandle final : public Handle {
+public:
+    WatchHandle(std::shared_ptr<Entry> watch, std::shared_ptr<Poll> poll)
+        : m_watch(watch)
+        , m_descriptor(watch->descriptor)
+        , m_poll(std::move(poll)) {}
+    ~WatchHandle() override { m_poll->remove(m_descriptor); }
+    WatchHandle(const WatchHandle&) = delete;
+    WatchHandle& operator=(const WatchHandle&) = delete;
+
+private:
+    const EntryHandle<Entry> m_watch;
+    const int m_descriptor;
+    const std::shared_ptr<Poll> m_poll;
+};
+
 } // namespace
 
 PollMainLoop::PollMainLoop(const Clock& clock)
     : m_clock(clock)
-    , m_wake(eventfd(0, EFD_CLOEXEC | EFD_NONBLOCK)) {}
+    , m_wake(eventfd(0, EFD_CLOEXEC | EFD_NONBLOCK))
+    , m_poll(std::make_shared<Poll>(m_wake.get())) {}
 
 void PollMainLoop::post(Task task) {
-    bool first = false;
+    bool wasAwake = false;
     {
         std::lock_guard lock(m_mutex);
-        first = m_posted.empty();
+        wasAwake = std::exchange(m_isAwake, true);
         m_posted.push_back(std::move(task));
     }
-    if (first) eventfd_write(m_wake.get(), 1);
+    if (!wasAwake) eventfd_write(m_wake.get(), 1);
 }
 
 std::unique_ptr<Handle> PollMainLoop::startTimer(Milliseconds delay, Milliseconds interval, Task task) {
@@ -73,7 +134,8 @@ std::unique_ptr<Handle> PollMainLoop::startTimer(Milliseconds delay, Millisecond
 std::unique_ptr<Handle> PollMainLoop::watchReadable(int descriptor, Task task) {
     auto watch = std::make_shared<Watch>(Watch{descriptor, std::move(task)});
     m_watches.push_back(watch);
-    return std::make_unique<EntryHandle<Watch>>(std::move(watch));
+    m_poll->add(descriptor);
+    return std::make_unique<WatchHandle<Watch, Poll>>(std::move(watch), m_poll);
 }
 
 void PollMainLoop::run() {
@@ -105,11 +167,13 @@ bool PollMainLoop::turn(Milliseconds patience) {
     {
         std::lock_guard lock(m_mutex);
         tasks.swap(m_posted);
+        m_isAwake = !tasks.empty();
     }
     const bool read = runReadable(tasks.empty() ? patience : Milliseconds::zero());
     if (tasks.empty()) {
         std::lock_guard lock(m_mutex);
         tasks.swap(m_posted);
+        m_isAwake = true;
     }
     const bool timed = runTimers();
     return runPosted(tasks) || timed || read;
@@ -134,26 +198,21 @@ int PollMainLoop::pollTimeout(Milliseconds patience) const {
 }
 
 bool PollMainLoop::runReadable(Milliseconds patience) {
-    const auto watches = m_watches; // callbacks add to the list
-    std::vector<pollfd> polled{{m_wake.get(), POLLIN, 0}};
-    for (const auto& watch : watches)
-        polled.push_back({watch->descriptor, POLLIN, 0});
-    if (poll(polled.data(), polled.size(), pollTimeout(patience)) <= 0) return false;
-
-    if (polled[0].revents != 0) {
-        eventfd_t ignored = 0;
-        eventfd_read(m_wake.get(), &ignored);
-    }
+    // The wake is told of once for each time that it is written, and never read.
+    const auto readable = m_poll->wait(pollTimeout(patience));
     bool ran = false;
-    for (std::size_t i = 0; i < watches.size(); ++i) {
-        if (polled[i + 1].revents == 0 || !watches[i]->live) continue;
-        watches[i]->task();
+    if (readable.empty() || (readable.size() == 1 && readable.contains(m_wake.get()))) return ran;
+    const auto watches = m_watches; // callbacks add to the list
+    for (const auto& watch : watches) {
+        if (!watch->live || !readable.contains(watch->descriptor)) continue;
+        watch->task();
         ran = true;
     }
     return ran;
 }
 
 bool PollMainLoop::runTimers() {
+    if (m_timers.empty()) return false;
     const auto now = m_clock.now();
     std::vector<std::shared_ptr<Timer>> due;
     std::ranges::copy_if(m_timers, std::back_inserter(due),

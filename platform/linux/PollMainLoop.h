@@ -11,7 +11,7 @@
 
 namespace platform {
 
-/// A main loop of poll(2), for programs without another one. A turn runs what is readable, then the timers
+/// A main loop of its own, for programs without another one. A turn runs what is readable, then the timers
 /// that are due, earliest first, then the tasks that were posted before it. Handles may outlive the loop.
 class PollMainLoop final : public MainLoop {
 public:
@@ -41,6 +41,7 @@ public:
 private:
     struct Timer;
     struct Watch;
+    class Poll;
     static constexpr Milliseconds forever{-1};
 
     int pollTimeout(Milliseconds patience) const;
@@ -50,10 +51,12 @@ private:
 
     const Clock& m_clock;
     Descriptor m_wake;
+    std::shared_ptr<Poll> m_poll; ///< handles may outlive the loop
     std::vector<std::shared_ptr<Timer>> m_timers;
     std::vector<std::shared_ptr<Watch>> m_watches;
     std::mutex m_mutex;
     std::vector<Task> m_posted; ///< guarded by m_mutex
+    bool m_isAwake = true;      ///< guarded by m_mutex; will look at what is posted before it waits
     std::atomic<bool> m_quit = false;
 };
 

@@ -15,6 +15,7 @@
 
 #include <bit>
 #include <cerrno>
+#include <chrono>
 #include <climits>
 #include <cstring>
 #include <utility>
@@ -59,10 +60,10 @@ Sending SendMessage(int socket, const msghdr& message) {
 
 /// -1 with errno. Whatever the sender left unread when it closed is told once, before what it sent, which
 /// counts.
-ssize_t ReceiveMessage(int socket, msghdr& message) {
+ssize_t ReceiveMessage(int socket, msghdr& message, int wait = MSG_DONTWAIT) {
     for (;;) {
-        const auto length = recvmsg(socket, &message, MSG_DONTWAIT | MSG_CMSG_CLOEXEC);
-        if (length >= 0 || (errno != EINTR && errno != ECONNRESET)) return length;
+        const auto length = recvmsg(socket, &message, wait | MSG_CMSG_CLOEXEC);
+        if (length >= 0 || (errno != ECONNRESET && (errno != EINTR || wait == 0))) return length;
     }
 }
 
@@ -155,12 +156,16 @@ Sending OutgoingPacket::sendCopy(int socket, std::uint16_t flags, std::uint64_t 
 }
 
 Sending OutgoingPacket::send(int socket, PacketHeader header) const {
-    std::vector<iovec> vectors{{&header, sizeof header}};
+    std::array<iovec, 8> few;
+    std::vector<iovec> many(m_pieces.size() < few.size() ? 0 : m_pieces.size() + 1);
+    auto* const vectors = many.empty() ? few.data() : many.data();
+    auto* end = vectors;
+    *end++ = {&header, sizeof header};
     for (const auto piece : m_pieces)
-        vectors.push_back({const_cast<std::byte*>(piece.data()), piece.size()});
+        *end++ = {const_cast<std::byte*>(piece.data()), piece.size()};
     msghdr message = {};
-    message.msg_iov = vectors.data();
-    message.msg_iovlen = vectors.size();
+    message.msg_iov = vectors;
+    message.msg_iovlen = static_cast<std::size_t>(end - vectors);
     Control control = {};
     if (m_memory) {
         message.msg_control = &control;
@@ -222,14 +227,16 @@ Sending SendAnswer(int socket, std::uint64_t sequence) {
     return SendMessage(socket, message);
 }
 
-Reading ReadAnswer(int socket, std::uint64_t& sequence) {
+namespace {
+
+Reading ReadAnswer(int socket, std::uint64_t& sequence, int wait) {
     PacketHeader header;
     iovec vector{&header, sizeof header};
     msghdr message = {}; // without room for descriptors: the system drops those that come
     message.msg_iov = &vector;
     message.msg_iovlen = 1;
-    const auto received = ReceiveMessage(socket, message);
-    if (received < 0 && errno == EAGAIN) return Reading::nothing;
+    const auto received = ReceiveMessage(socket, message, wait);
+    if (received < 0 && (errno == EAGAIN || errno == EINTR)) return Reading::nothing;
     if (received <= 0) return Reading::end;
     const PacketHeader expected{.flags = PacketHeader::isAnswer, .sequence = header.sequence};
     if (received != sizeof header || IsTruncated(message) ||
@@ -237,6 +244,21 @@ Reading ReadAnswer(int socket, std::uint64_t& sequence) {
         return Reading::bad;
     sequence = header.sequence;
     return Reading::packet;
+}
+
+} // namespace
+
+Reading ReadAnswer(int socket, std::uint64_t& sequence) {
+    return ReadAnswer(socket, sequence, MSG_DONTWAIT);
+}
+
+Reading AwaitAnswer(int socket, std::uint64_t& sequence) {
+    return ReadAnswer(socket, sequence, 0);
+}
+
+void SetPatience(int socket, std::chrono::milliseconds time) {
+    const timeval wait{time.count() / 1000, time.count() % 1000 * 1000};
+    setsockopt(socket, SOL_SOCKET, SO_RCVTIMEO, &wait, sizeof wait);
 }
 
 } // namespace platform

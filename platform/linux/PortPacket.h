@@ -3,6 +3,7 @@
 #include "platform/linux/SealedMemory.h"
 
 #include <array>
+#include <chrono>
 #include <cstdint>
 #include <memory>
 #include <sys/socket.h>
@@ -103,6 +104,10 @@ private:
 };
 
 Sending SendAnswer(int socket, std::uint64_t sequence);
-Reading ReadAnswer(int socket, std::uint64_t& sequence); ///< never blocks; expects nothing but answers
+/// Expects nothing but answers; never blocks.
+Reading ReadAnswer(int socket, std::uint64_t& sequence);
+/// The same, and waits for as long as `SetPatience` has said, or until a signal comes.
+Reading AwaitAnswer(int socket, std::uint64_t& sequence);
+void SetPatience(int socket, std::chrono::milliseconds time);
 
 } // namespace platform

@@ -88,7 +88,14 @@ ProcProcessTable::ProcProcessTable(MainLoop& mainLoop, const Clock& clock, const
     , m_applications(m_processes, clock, places.dataDirectories, places.programDirectories) {}
 
 std::optional<ProcessSerialNumber> ProcProcessTable::currentProcess() const {
-    return serialNumberOf(getpid());
+    // Every message asks: reading its record again would cost more than sending it.
+    const auto pid = static_cast<std::uint32_t>(getpid());
+    const auto known = m_current.load();
+    if (static_cast<std::uint32_t>(known) == pid)
+        return ProcessSerialNumber{static_cast<std::uint32_t>(known >> 32), pid};
+    const auto current = serialNumberOf(static_cast<int>(pid));
+    if (current) m_current = std::uint64_t{current->highLongOfPSN} << 32 | pid;
+    return current;
 }
 
 std::optional<ProcessSerialNumber> ProcProcessTable::serialNumberOf(int pid) const {

@@ -5,6 +5,7 @@
 #include "platform/linux/ApplicationIdentifier.h"
 #include "platform/linux/ProcDirectory.h"
 
+#include <atomic>
 #include <cstdint>
 #include <string>
 #include <unordered_map>
@@ -50,6 +51,8 @@ private:
     MainLoop& m_mainLoop;
     ProcDirectory m_processes;
     mutable ApplicationIdentifier m_applications;
+    /// This process once it was asked for, the id below the start; another's id after a fork.
+    mutable std::atomic<std::uint64_t> m_current = 0;
     mutable std::vector<int> m_walk; ///< the ids of the walk under way, ascending
     mutable std::uint64_t m_walkTicks = 0;
     mutable std::unordered_map<int, Known> m_known; ///< by id, so that a walk reads little of each process

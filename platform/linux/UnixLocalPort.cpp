@@ -32,6 +32,7 @@ namespace platform {
 namespace {
 constexpr std::uint64_t wakeTag = 0;
 constexpr std::uint64_t listenerTag = 1;
+constexpr std::size_t largestGroup = 16;
 constexpr int connectionsOfSender = 16; // the library keeps one, and opens another now and then to look
 } // namespace
 
@@ -39,6 +40,7 @@ UnixLocalPort::UnixLocalPort(OwnedName name, const Clock& clock, PortTap& tap)
     : m_clock(clock)
     , m_tap(tap)
     , m_label(name.name())
+    , m_user(geteuid())
     , m_wake(std::make_shared<const Descriptor>(eventfd(0, EFD_CLOEXEC | EFD_NONBLOCK)))
     , m_backlog(std::make_shared<Backlog>([wake = m_wake] { eventfd_write(wake->get(), 1); }))
     , m_epoll(epoll_create1(EPOLL_CLOEXEC))
@@ -53,7 +55,7 @@ UnixLocalPort::~UnixLocalPort() {
     close();
 }
 
-void UnixLocalPort::run(const std::function<void(Arrival)>& receiver) {
+void UnixLocalPort::run(const Receiver& receiver) {
     PacketReader reader;
     std::array<epoll_event, 64> events;
     while (!m_closed) {
@@ -64,8 +66,8 @@ void UnixLocalPort::run(const std::function<void(Arrival)>& receiver) {
                 resumePaused();
             else if (event.data.u64 == listenerTag)
                 accept();
-            else if (auto arrival = read(event.data.u64, reader))
-                receiver(std::move(*arrival));
+            else if (auto arrivals = read(event.data.u64, reader); !arrivals.empty())
+                receiver(std::move(arrivals));
         }
     }
 }
@@ -98,7 +100,7 @@ void UnixLocalPort::accept() {
     ucred sender = {};
     socklen_t size = sizeof sender;
     getsockopt(socket.get(), SOL_SOCKET, SO_PEERCRED, &sender, &size);
-    if (sender.uid != geteuid()) return complain(sender.pid, "another user's");
+    if (sender.uid != m_user) return complain(sender.pid, "another user's");
     const auto isOfSender = [&](const auto& entry) { return entry.second->peer().processID == sender.pid; };
     if (std::ranges::count_if(m_connections, isOfSender) >= connectionsOfSender)
         return complain(sender.pid, "too many");
@@ -116,32 +118,38 @@ void UnixLocalPort::refuseOne() {
     complain(0, "no descriptor left");
 }
 
-std::optional<Arrival> UnixLocalPort::read(std::uint64_t tag, PacketReader& reader) {
+/// What is there now, and little enough for the others to have their turn soon.
+std::vector<Arrival> UnixLocalPort::read(std::uint64_t tag, PacketReader& reader) {
+    std::vector<Arrival> group;
     const std::lock_guard lock(m_mutex);
     const auto found = m_connections.find(tag);
-    if (found == m_connections.end()) return std::nullopt;
-    const auto& connection = *found->second;
-    if (!m_backlog->admits(connection.peer().processID)) {
-        pause(tag);
-        return std::nullopt;
+    if (found == m_connections.end()) return group;
+    const auto connection = found->second;
+    bool isOver = false, isWaitedFor = false;
+    // Whoever waits for an answer has sent nothing after it.
+    while (group.size() < largestGroup && !isWaitedFor) {
+        if (!m_backlog->admits(connection->peer().processID)) {
+            pause(tag);
+            break;
+        }
+        IncomingPacket packet;
+        if (!readPacket(*connection, reader, packet, isOver)) break;
+        isWaitedFor = (packet.header.flags & PacketHeader::wantsAnswer) != 0;
+        if (auto arrival = take(connection, std::move(packet))) group.push_back(std::move(*arrival));
     }
-    IncomingPacket packet;
-    switch (reader.read(connection.socket(), packet)) {
-    case Reading::packet:
-        if (packet.sender.uid == geteuid() && packet.sender.pid == connection.peer().processID)
-            return take(found->second, std::move(packet));
-        packet.fault = "sent by another process";
-        [[fallthrough]];
-    case Reading::bad:
-        complain(connection.peer().processID, packet.fault);
-        [[fallthrough]];
-    case Reading::end:
-        remove(tag);
-        return std::nullopt;
-    case Reading::nothing:
-        return std::nullopt;
-    }
-    return std::nullopt;
+    if (isOver) remove(tag);
+    return group;
+}
+
+bool UnixLocalPort::readPacket(const IncomingConnection& connection, PacketReader& reader,
+                               IncomingPacket& packet, bool& isOver) {
+    const auto reading = reader.read(connection.socket(), packet);
+    const bool isOwn = packet.sender.uid == m_user && packet.sender.pid == connection.peer().processID;
+    if (reading == Reading::packet && isOwn) return true;
+    isOver = reading != Reading::nothing;
+    if (reading == Reading::packet) packet.fault = "sent by another process";
+    if (packet.fault) complain(connection.peer().processID, packet.fault);
+    return false;
 }
 
 std::optional<Arrival> UnixLocalPort::take(const std::shared_ptr<IncomingConnection>& connection,

@@ -18,9 +18,9 @@ namespace platform {
 class Backlog;
 class IncomingConnection;
 
-/// A port under a name of ours. Senders are served in turns, a packet each, so that none crowds out another,
-/// and one who is ahead of the main thread is not read until that has caught up. Who sends what is no packet,
-/// or in another process's name, is cut off.
+/// A port under a name of ours. Senders are served in turns, a few packets each, so that none crowds out
+/// another, and one who is ahead of the main thread is not read until that has caught up. Who sends what is
+/// no packet, or in another process's name, is cut off.
 class UnixLocalPort final : public LocalPort {
 public:
     UnixLocalPort(OwnedName name, const Clock& clock, PortTap& tap);
@@ -28,14 +28,16 @@ public:
     UnixLocalPort(const UnixLocalPort&) = delete;
     UnixLocalPort& operator=(const UnixLocalPort&) = delete;
 
-    void run(const std::function<void(Arrival)>& receiver) override;
+    void run(const Receiver& receiver) override;
     void close() override;
 
 private:
     void watch(int descriptor, std::uint64_t tag);
     void accept();
     void refuseOne();
-    std::optional<Arrival> read(std::uint64_t tag, PacketReader& reader);
+    std::vector<Arrival> read(std::uint64_t tag, PacketReader& reader);
+    bool readPacket(const IncomingConnection& connection, PacketReader& reader, IncomingPacket& packet,
+                    bool& isOver);
     std::optional<Arrival> take(const std::shared_ptr<IncomingConnection>& connection, IncomingPacket packet);
     void pause(std::uint64_t tag);
     void resumePaused();
@@ -45,6 +47,7 @@ private:
     const Clock& m_clock;
     PortTap& m_tap;
     const std::string m_label;
+    const uid_t m_user;                             ///< whose packets are taken
     const std::shared_ptr<const Descriptor> m_wake; ///< receipts may outlive the port
     const std::shared_ptr<Backlog> m_backlog;
     Descriptor m_epoll;

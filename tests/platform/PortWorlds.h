@@ -46,7 +46,11 @@ public:
         , m_onArrival(std::move(onArrival))
         , m_port(ports.open(name))
         , m_thread([this] {
-            if (m_port) m_port->run([this](platform::Arrival arrival) { take(std::move(arrival)); });
+            if (!m_port) return;
+            m_port->run([this](std::vector<platform::Arrival> arrivals) {
+                for (auto& arrival : arrivals)
+                    take(std::move(arrival));
+            });
         }) {}
     ~Listener() {
         close();

@@ -60,7 +60,7 @@ TYPED_TEST(PortContract, givesANameToOneOwnerUntilItCloses) {
     EXPECT_TRUE(second);
     first->close();
     EXPECT_TRUE(server.isListening(name));
-    first->run([](Arrival) { FAIL(); });
+    first->run([](const std::vector<Arrival>&) { FAIL(); });
 }
 
 TYPED_TEST(PortContract, synchronousSendWaitsForTheReceipt) {

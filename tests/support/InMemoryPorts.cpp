@@ -47,7 +47,7 @@ public:
         return m_network.m_owners.try_emplace(m_name, m_mailbox).second;
     }
 
-    void run(const std::function<void(Arrival)>& receiver) override {
+    void run(const Receiver& receiver) override {
         std::unique_lock lock(m_network.m_mutex);
         for (;;) {
             m_network.m_changed.wait(lock, [&] { return m_mailbox->closed || !m_mailbox->letters.empty(); });
@@ -56,7 +56,9 @@ public:
             m_mailbox->letters.pop_front();
             lock.unlock();
             letter.waiter.reset();
-            receiver(std::move(letter.arrival));
+            std::vector<Arrival> arrivals;
+            arrivals.push_back(std::move(letter.arrival));
+            receiver(std::move(arrivals));
             lock.lock();
         }
     }
@@ -104,7 +106,7 @@ public:
         const auto waiter = synchronous ? std::make_shared<InMemoryPortNetwork::Waiter>() : nullptr;
 
         std::unique_lock lock(m_network.m_mutex);
-        if (m_mailbox->closed) return SendStatus::becameInvalid;
+        if (m_mailbox->closed) return SendStatus::isInvalid;
         m_mailbox->letters.push_back({{SharedBytes::copyOf(joined.data(), joined.size()), m_self,
                                        std::make_unique<InMemoryReceipt>(m_network, waiter)},
                                       waiter});

@@ -76,18 +76,26 @@ KXRect KXRectCenteringSize(const KXRect& r, KXSize s) {
             s.width, s.height};
 }
 
-KXRect KXRectFittingAspect(const KXRect& r, float a) {
+namespace {
+
+KXRect withAspect(const KXRect& r, float a, bool fills) {
     if (KXAspectIsInvalid(a) || KXRectIsInvalid(r)) return {};
-    const bool wider = KXAspectIsWider(a, KXSizeAspectRatio(r.size()));
-    return centredOn(r, wider ? KXSize{r.width, KXHeightForAspect(a, r.width)}
-                              : KXSize{KXWidthForAspect(a, r.height), r.height});
+    const float own = KXSizeAspectRatio(r.size());
+    // Width / height * height is not always the width again.
+    if (a == own) return r;
+    const bool keepsWidth = fills ? KXAspectIsWider(own, a) : KXAspectIsWider(a, own);
+    return centredOn(r, keepsWidth ? KXSize{r.width, KXHeightForAspect(a, r.width)}
+                                   : KXSize{KXWidthForAspect(a, r.height), r.height});
+}
+
+} // namespace
+
+KXRect KXRectFittingAspect(const KXRect& r, float a) {
+    return withAspect(r, a, false);
 }
 
 KXRect KXRectFillingAspect(const KXRect& r, float a) {
-    if (KXAspectIsInvalid(a) || KXRectIsInvalid(r)) return {};
-    const bool wider = KXAspectIsWider(KXSizeAspectRatio(r.size()), a);
-    return centredOn(r, wider ? KXSize{r.width, KXHeightForAspect(a, r.width)}
-                              : KXSize{KXWidthForAspect(a, r.height), r.height});
+    return withAspect(r, a, true);
 }
 
 std::int32_t KXPixelCount(float count) {

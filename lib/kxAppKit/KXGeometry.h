@@ -15,11 +15,11 @@ bool KXPointIsInvalid(KXPoint p); ///< zero and negative coordinates are valid
 bool KXRectIsInvalid(const KXRect& r);
 bool KXAspectIsInvalid(float a);
 
-float KXSizeAspectRatio(KXSize s);      ///< width / height; 0 when invalid
-float KXSizeArea(KXSize s);             ///< 0 when invalid
-bool KXAspectIsWider(float a, float b); ///< false when either is invalid
-float KXWidthForAspect(float a, float height);
-float KXHeightForAspect(float a, float width);
+float KXSizeAspectRatio(KXSize s);             ///< width / height; 0 when invalid
+float KXSizeArea(KXSize s);                    ///< 0 when invalid
+bool KXAspectIsWider(float a, float b);        ///< false when either is invalid
+float KXWidthForAspect(float a, float height); ///< 0 when either is invalid
+float KXHeightForAspect(float a, float width); ///< 0 when either is invalid
 
 /// A rectangle of size `s` in the middle of `r`; the offsets are whole, rounded half away from zero.
 KXRect KXRectCenteringSize(const KXRect& r, KXSize s);

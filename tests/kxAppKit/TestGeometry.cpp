@@ -45,6 +45,7 @@ TEST(Geometry, CentresFitsAndFills) {
         {{0, 0, 32, 32}, 0.5f, {8, 0, 16, 32}, {0, -16, 32, 64}},
         {{1, 2, 32, 16}, 2, {1, 2, 32, 16}, {1, 2, 32, 16}},
         {{0, 0, 3, 2}, 1, {0.5f, 0, 2, 2}, {0, -0.5f, 3, 3}},
+        {{0, 0, 2, 82}, 1.0f / 41, {0, 0, 2, 82}, {0, 0, 2, 82}}, // of which 82 times are not quite 2
     };
     for (const auto& [rect, aspect, fitting, filling] : cases) {
         EXPECT_EQ(KXRectFittingAspect(rect, aspect), fitting) << aspect;

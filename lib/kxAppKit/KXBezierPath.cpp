@@ -56,6 +56,7 @@ KXBezierPath KXBezierPath::bezierPathWithRoundRect(const KXRect& rect, float rad
 KXBezierPath KXBezierPath::arrowInRect(const KXRect& r, std::int32_t direction) {
     KXBezierPath path;
     if (direction < KXArrowDirectionUp || direction > KXArrowDirectionRight) return path;
+    // The apex itself is rounded, not its distance from the edge.
     const float middleX = std::round(r.x + r.width * 0.5f);
     const float middleY = std::round(r.y + r.height * 0.5f);
     const KXPoint corners[4][3] = {

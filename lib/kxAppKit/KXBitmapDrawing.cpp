@@ -121,6 +121,7 @@ Way wayToDraw(const KXBitmapImageRep* source, const KXBitmapImageRep& target, co
     const KXSize pixels = source->pixelSize();
     if (pixels == rect.size() && rect == KXIntegralRect(rect)) return Way::copy;
     const bool premultiplied = !(source->bitmapFormat() & KXAlphaNonpremultipliedBitmapFormat);
+    // One axis is enough: the other may shrink.
     const bool grows = rect.width > pixels.width || rect.height > pixels.height;
     if (interpolation == KXImageInterpolation::high && rect == wholeOf(target) && premultiplied && grows)
         return Way::enlarge;

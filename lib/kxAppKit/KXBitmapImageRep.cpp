@@ -165,6 +165,7 @@ void KXBitmapImageRep::setColorProfileFromBitmap(const KXBitmapImageRep& other) 
 }
 
 bool KXBitmapImageRep::convertBitmapDataFromFormat(KXBitmapFormat from, KXBitmapFormat to) {
+    // Even when there is nothing to convert.
     if (!isKnown(from) || !isKnown(to) || !is32bitNonPlanarRGBWithAlpha()) {
         Log("%s: invalid bitmap conversion parameters: srcFormat=%d, dstFormat=%d, bitmap: %s\n",
             "-[NSBitmapImageRep(KXAppKitAdditions) convertBitmapDataFromFormat:toFormat:]",

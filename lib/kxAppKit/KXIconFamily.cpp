@@ -69,6 +69,7 @@ KXImageRep::Pointer sourceFor(const KXImage& image, KXSize size, bool mayUpscale
     return isSmaller && isBitmap ? padded(source) : source;
 }
 
+/// A padded source has the aspect that its frame gives it.
 bool drawFitting(const KXImageRep& source, KXBitmapImageRep& target, KXSize size) {
     return source.drawIntoBitmapRep(target,
                                     KXRectFittingAspect(wholeOf(size), KXSizeAspectRatio(source.pixelSize())),
@@ -148,6 +149,7 @@ SharedBytes KXImage::icnsData() const {
             Log("Could not draw icon for size %u\n", member.size);
             continue;
         }
+        // Every type's pixels are raw, though readers may know some of them packed.
         append(elements, member.elementType, headerSize + static_cast<std::uint32_t>(pixels.size()));
         elements.insert(elements.end(), pixels.begin(), pixels.end());
     }

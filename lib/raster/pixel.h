@@ -30,6 +30,7 @@ inline std::uint32_t blendWords(std::uint32_t a, std::uint32_t b, std::uint32_t 
 /// The sum of up to 32 weighted pixels, and its average by a step in 16.16.
 class BoxSum {
 public:
+    /// Each product loses its low byte before it is added, not the sum.
     void add(std::uint32_t word, std::uint32_t weight) {
         m_even += (word & evenChannels) * weight >> 8 & evenChannels;
         m_odd += (word >> 8 & evenChannels) * weight >> 8 & evenChannels;

@@ -19,6 +19,7 @@ using raster::BoxRun;
 using raster::boxRun;
 using raster::BoxSum;
 using raster::indexAt;
+using raster::LinearPlan;
 using raster::load;
 using raster::rowOps;
 using raster::Sampling;
@@ -75,7 +76,7 @@ bool formatsAreSupported(const Format& from, const Format& to) {
     return false;
 }
 
-/// How one axis is walked.
+/// How one axis is walked. Both axes begin half a source pixel early when they grow.
 struct Axis {
     enum class Way { nearest, linear, box };
     std::uint32_t step;
@@ -84,6 +85,7 @@ struct Axis {
 
     Axis(double scale, bool filtering, std::int64_t first) {
         constexpr double largest = 4294967295.0;
+        // Cut off, not rounded.
         step = static_cast<std::uint32_t>(std::clamp(65536 / scale, 0.0, largest));
         way = !filtering || step == 0x10000 ? Way::nearest : step < 0x10000 ? Way::linear : Way::box;
         start = first * static_cast<std::int64_t>(step) - (way == Way::linear ? 0x8000 : 0);
@@ -110,17 +112,17 @@ void packPixel(std::uint8_t* to, std::uint32_t word, const Format& from, const F
 }
 
 /// Rows of narrower pixels are rare: one pixel's neighbours are widened at a time.
-void scaleNarrowRow(std::uint8_t* to, const std::uint8_t* from, std::ptrdiff_t bytes, const Axis& axis,
+void scaleNarrowRow(std::uint8_t* to, const std::uint8_t* from, std::ptrdiff_t bytes, Axis::Way way,
                     Sampling s, std::size_t width) {
     const auto pixel = [&](std::int64_t index) {
         return loadNarrow(from + std::clamp<std::int64_t>(index, 0, s.sourceCount - 1) * bytes, bytes);
     };
-    const std::uint64_t reciprocal = axis.way == Axis::Way::box ? BoxSum::reciprocalOf(s.step) : 0;
+    const std::uint64_t reciprocal = way == Axis::Way::box ? BoxSum::reciprocalOf(s.step) : 0;
     for (; width > 0; --width, to += 4, s.position += s.step) {
         const std::int64_t index = s.position >> 16;
-        if (axis.way == Axis::Way::nearest) {
+        if (way == Axis::Way::nearest) {
             store(to, pixel(index));
-        } else if (axis.way == Axis::Way::linear) {
+        } else if (way == Axis::Way::linear) {
             store(to, blendWords(pixel(index), pixel(index + 1), weightAt(s.position)));
         } else {
             const BoxRun run = boxRun(s.position, s.step);
@@ -132,21 +134,35 @@ void scaleNarrowRow(std::uint8_t* to, const std::uint8_t* from, std::ptrdiff_t b
     }
 }
 
-/// One source row at the destination's width, as words.
-void scaleRow(std::uint8_t* to, const Source& source, std::int64_t y, const Axis& axis, std::size_t width) {
-    const Sampling sampling{axis.start, axis.step, source.width};
-    const std::uint8_t* const from = source.row(y);
-    if (source.format.bytes() != 4)
-        return scaleNarrowRow(to, from, source.format.bytes(), axis, sampling, width);
-    switch (axis.way) {
-    case Axis::Way::nearest:
-        return rowOps().sampleNearest(to, from, sampling, width);
-    case Axis::Way::linear:
-        return rowOps().sampleLinear(to, from, sampling, width);
-    case Axis::Way::box:
-        return rowOps().sampleBox(to, from, sampling, width);
+/// Scales source rows to the destination's width, as words.
+class RowScaler {
+public:
+    RowScaler(const Source& source, const Axis& axis, std::int64_t width)
+        : m_source(source)
+        , m_way(axis.way)
+        , m_plan({axis.start, axis.step, source.width}, width) {
+        if (m_way == Axis::Way::linear && rowOps().planLinear) rowOps().planLinear(m_plan);
     }
-}
+    std::size_t width() const { return static_cast<std::size_t>(m_plan.count); }
+    void scaleRow(std::uint8_t* to, std::int64_t y) const {
+        const std::uint8_t* const from = m_source.row(y);
+        if (m_source.format.bytes() != 4)
+            return scaleNarrowRow(to, from, m_source.format.bytes(), m_way, m_plan.sampling, width());
+        switch (m_way) {
+        case Axis::Way::nearest:
+            return rowOps().sampleNearest(to, from, m_plan.sampling, width());
+        case Axis::Way::linear:
+            return rowOps().sampleLinear(to, from, m_plan);
+        case Axis::Way::box:
+            return rowOps().sampleBox(to, from, m_plan.sampling, width());
+        }
+    }
+
+private:
+    Source m_source;
+    Axis::Way m_way;
+    LinearPlan m_plan;
+};
 
 /// Scaled source rows; row r stands in entry r modulo the number of entries. No vector of a row crosses two
 /// cache lines.
@@ -155,12 +171,9 @@ class RowCache {
 
 public:
     /// `spareRows` rows more stand behind the entries.
-    RowCache(const Source& source, const Axis& axis, std::size_t width, std::size_t entries,
-             std::size_t spareRows)
-        : m_source(source)
-        , m_axis(axis)
-        , m_width(width)
-        , m_rowBytes((width * 4 + 4 + lineBytes - 1) / lineBytes * lineBytes)
+    RowCache(const RowScaler& scaler, std::size_t entries, std::size_t spareRows)
+        : m_scaler(scaler)
+        , m_rowBytes((scaler.width() * 4 + 4 + lineBytes - 1) / lineBytes * lineBytes)
         , m_entries(entries)
         , m_memory(static_cast<std::uint8_t*>(CheckedMalloc(
               -1, entries * sizeof(std::int64_t) + lineBytes + (entries + spareRows) * m_rowBytes,
@@ -173,11 +186,11 @@ public:
     std::uint8_t* spareRow() { return memoryOf(m_entries); }
 
     const std::uint8_t* row(std::int64_t y) {
-        const std::size_t entry = static_cast<std::size_t>(y) % m_entries;
+        const std::size_t entry = static_cast<std::uint32_t>(y) % static_cast<std::uint32_t>(m_entries);
         std::uint8_t* const pixels = memoryOf(entry);
         if (std::memcmp(held(entry), &y, sizeof y) == 0) return pixels;
         std::memcpy(held(entry), &y, sizeof y);
-        scaleRow(pixels, m_source, y, m_axis, m_width);
+        m_scaler.scaleRow(pixels, y);
         return pixels;
     }
 
@@ -195,33 +208,48 @@ private:
         return rows + -reinterpret_cast<std::uintptr_t>(rows) % lineBytes + entry * m_rowBytes;
     }
 
-    Source m_source;
-    Axis m_axis;
-    std::size_t m_width;
+    const RowScaler& m_scaler;
     std::size_t m_rowBytes;
     std::size_t m_entries;
     std::unique_ptr<std::uint8_t, Freed> m_memory;
 };
 
-/// Combines cached rows to one row of words at a position.
-void scaleColumn(std::uint8_t* to, RowCache& cache, const Axis& axis, std::int64_t position, int sourceHeight,
-                 std::size_t width) {
+/// The next rows of the destination, as words.
+struct Rows {
+    RasterRows<std::uint8_t> to;
+    std::int64_t position;
+    std::int64_t count;
+    std::size_t width;
+};
+
+/// Combines cached rows at a position to as many rows as come from the same ones, up to `rows.count`; how
+/// many.
+std::int64_t scaleColumns(const Rows& rows, RowCache& cache, const Axis& axis, int sourceHeight) {
+    constexpr std::int64_t most = raster::RowOps::mostBlends;
     const auto rowAt = [&](std::int64_t index) {
         return cache.row(std::clamp<std::int64_t>(index, 0, sourceHeight - 1));
     };
-    const std::int64_t index = position >> 16;
+    const std::int64_t index = rows.position >> 16;
     if (axis.way == Axis::Way::nearest) {
-        std::memcpy(to, rowAt(index), width * 4);
+        std::memcpy(rows.to.data, rowAt(index), rows.width * 4);
     } else if (axis.way == Axis::Way::linear) {
+        std::uint8_t weights[most];
+        std::int64_t made = 0;
+        for (std::int64_t at = rows.position; made < std::min(rows.count, most) && at >> 16 == index;
+             at += axis.step)
+            weights[made++] = weightAt(at);
         const std::uint8_t* const upper = rowAt(index);
-        rowOps().blend(to, upper, rowAt(index + 1), weightAt(position), width);
+        rowOps().blend(rows.to, upper, rowAt(index + 1), {weights, static_cast<std::size_t>(made)},
+                       rows.width);
+        return made;
     } else {
-        const BoxRun run = boxRun(position, axis.step);
-        const std::uint8_t* rows[BoxRun::maximum];
+        const BoxRun run = boxRun(rows.position, axis.step);
+        const std::uint8_t* boxRows[BoxRun::maximum];
         for (int i = 0; i < run.count; ++i)
-            rows[i] = rowAt(run.first + i);
-        rowOps().averageRows(to, rows, run, axis.step, width);
+            boxRows[i] = rowAt(run.first + i);
+        rowOps().averageRows(rows.to.data, boxRows, run, axis.step, rows.width);
     }
+    return 1;
 }
 
 std::size_t cacheEntries(const Axis& vertical, bool filtering) {
@@ -232,19 +260,18 @@ std::size_t cacheEntries(const Axis& vertical, bool filtering) {
 }
 
 /// Without vertical filtering the destination is its own cache: a row that comes again is copied.
-void scaleRowsInto(const Destination& to, const RasterRect& rect, const Source& from, const Axis& horizontal,
-                   const Axis& vertical) {
-    const auto width = static_cast<std::size_t>(rect.width());
+void scaleRowsInto(const Destination& to, const RasterRect& rect, const RowScaler& scaler,
+                   const Axis& vertical, int sourceHeight) {
     const std::uint8_t* before = nullptr;
     std::int64_t heldRow = -1;
     std::int64_t position = vertical.start;
     for (std::int64_t y = rect.top; y < rect.bottom; ++y, position += vertical.step) {
         std::uint8_t* const row = to.row(y) + rect.left * 4;
-        const std::int64_t sourceRow = indexAt(position, from.height);
+        const std::int64_t sourceRow = indexAt(position, sourceHeight);
         if (sourceRow == heldRow)
-            std::memcpy(row, before, width * 4);
+            std::memcpy(row, before, scaler.width() * 4);
         else
-            scaleRow(row, from, sourceRow, horizontal, width);
+            scaler.scaleRow(row, sourceRow);
         heldRow = sourceRow;
         before = row;
     }
@@ -255,14 +282,16 @@ void scaleInto(const Destination& to, const RasterRect& rect, const Source& from
     const auto width = static_cast<std::size_t>(rect.width());
     const std::ptrdiff_t pixelBytes = to.format.bytes();
     const bool direct = to.format == from.format && pixelBytes == 4;
+    const RowScaler scaler(from, horizontal, rect.width());
     if (direct && vertical.way == Axis::Way::nearest)
-        return scaleRowsInto(to, rect, from, horizontal, vertical);
-    RowCache cache(from, horizontal, width, cacheEntries(vertical, filtering), direct ? 0 : 1);
-    std::int64_t position = vertical.start;
-    for (std::int64_t y = rect.top; y < rect.bottom; ++y, position += vertical.step) {
+        return scaleRowsInto(to, rect, scaler, vertical, from.height);
+    RowCache cache(scaler, cacheEntries(vertical, filtering), direct ? 0 : 1);
+    for (std::int64_t y = rect.top; y < rect.bottom;) {
         std::uint8_t* row = to.row(y) + rect.left * pixelBytes;
         std::uint8_t* words = direct ? row : cache.spareRow();
-        scaleColumn(words, cache, vertical, position, from.height, width);
+        const std::int64_t position = vertical.start + (y - rect.top) * std::int64_t{vertical.step};
+        y += scaleColumns({{words, to.bytesPerRow}, position, direct ? rect.bottom - y : 1, width}, cache,
+                          vertical, from.height);
         if (direct) continue;
         for (std::size_t x = 0; x < width; ++x, row += pixelBytes, words += 4)
             packPixel(row, load(words), from.format, to.format);
@@ -292,6 +321,7 @@ int Raster_Scale(void* destination, int destinationBytesPerRow, int destinationB
     if (!formatsAreSupported(from.format, to.format) || !to.isSane() || !from.isSane()) return 0;
     // Not "scale <= smallest": NaN fails too.
     if (!(horizontalScale > smallestScale) || !(verticalScale > smallestScale)) return 0;
+    // Only here: nothing to do with a bad size or scale is a failure, too.
     if (rect.isEmpty() || to.width == 0 || to.height == 0 || from.width == 0 || from.height == 0) return 1;
     if (to.isUnusable() || from.isUnusable() || from.width < 0 || from.height < 0) return 0;
     const bool filtering = to.format.depth >= 24 && filter != 0;

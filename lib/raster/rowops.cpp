@@ -61,10 +61,13 @@ void multiply(std::uint8_t* to, RasterLayout toLayout, const std::uint8_t* from,
     }
 }
 
-void blend(std::uint8_t* to, const std::uint8_t* a, const std::uint8_t* b, std::uint8_t weight,
-           std::size_t count) {
-    for (std::size_t i = 0; i < count * pixelBytes; i += pixelBytes)
-        store(to + i, blendWords(load(a + i), load(b + i), weight));
+void blend(RasterRows<std::uint8_t> to, const std::uint8_t* a, const std::uint8_t* b,
+           std::span<const std::uint8_t> weights, std::size_t count) {
+    for (const std::uint8_t weight : weights) {
+        for (std::size_t i = 0; i < count * pixelBytes; i += pixelBytes)
+            store(to.data + i, blendWords(load(a + i), load(b + i), weight));
+        to.data += to.bytesPerRow;
+    }
 }
 
 void sampleNearest(std::uint8_t* to, const std::uint8_t* from, Sampling s, std::size_t count) {
@@ -72,8 +75,9 @@ void sampleNearest(std::uint8_t* to, const std::uint8_t* from, Sampling s, std::
         std::memcpy(to, from + indexAt(s.position, s.sourceCount) * 4, pixelBytes);
 }
 
-void sampleLinear(std::uint8_t* to, const std::uint8_t* from, Sampling s, std::size_t count) {
-    for (; count > 0; --count, to += pixelBytes, s.position += s.step) {
+void sampleLinear(std::uint8_t* to, const std::uint8_t* from, const LinearPlan& plan) {
+    Sampling s = plan.sampling;
+    for (std::int64_t count = plan.count; count > 0; --count, to += pixelBytes, s.position += s.step) {
         const std::uint32_t left = load(from + indexAt(s.position, s.sourceCount) * 4);
         const std::uint32_t right = load(from + indexAt(s.position + 0x10000, s.sourceCount) * 4);
         store(to, blendWords(left, right, weightAt(s.position)));
@@ -123,8 +127,8 @@ BoxRun boxRun(std::int64_t position, std::uint32_t step) {
     return run;
 }
 
-extern constexpr RowOps scalarRowOps{"scalar", permute,       premultiply,  unpremultiply, multiply,
-                                     blend,    sampleNearest, sampleLinear, sampleBox,     averageRows};
+extern constexpr RowOps scalarRowOps{"scalar",      permute, premultiply,  unpremultiply, multiply,   blend,
+                                     sampleNearest, nullptr, sampleLinear, sampleBox,     averageRows};
 
 const RowOps& rowOps() {
     static const RowOps& fastest = *availableRowOps().back();

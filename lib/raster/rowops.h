@@ -38,7 +38,22 @@ struct RowParts {
     }
 };
 
-/// One run of a box average: the rows or pixels first ... first + count - 1 with their weights.
+/// What the rows of one enlargement have in common. Its size does not depend on theirs.
+struct LinearPlan {
+    static constexpr std::size_t kernelBytes = 8192;
+    Sampling sampling;
+    std::int64_t count;
+    RowParts parts;
+    alignas(64) std::byte kernel[kernelBytes]; ///< for the instruction set that completes the plan
+
+    LinearPlan(const Sampling& s, std::int64_t pixels)
+        : sampling(s)
+        , count(pixels)
+        , parts(s, pixels) {}
+};
+
+/// One run of a box average: the rows or pixels first ... first + count - 1 with their weights. More than the
+/// maximum are left out, and the average divides by the whole step all the same: such reductions grow darker.
 struct BoxRun {
     static constexpr int maximum = 32;
     std::int64_t first;
@@ -56,11 +71,15 @@ struct RowOps {
     void (*unpremultiply)(std::uint8_t* pixels, std::size_t count, int alphaByte);
     void (*multiply)(std::uint8_t* to, RasterLayout toLayout, const std::uint8_t* from,
                      RasterLayout fromLayout, std::size_t count);
-    /// (a * (255 - weight) + b * weight) >> 8
-    void (*blend)(std::uint8_t* to, const std::uint8_t* a, const std::uint8_t* b, std::uint8_t weight,
-                  std::size_t count);
+    static constexpr std::int64_t mostBlends = 4;
+    /// One row for each of 1 to `mostBlends` weights, (a * (255 - weight) + b * weight) >> 8. No row is a or
+    /// b.
+    void (*blend)(RasterRows<std::uint8_t> to, const std::uint8_t* a, const std::uint8_t* b,
+                  std::span<const std::uint8_t> weights, std::size_t count);
     void (*sampleNearest)(std::uint8_t* to, const std::uint8_t* from, Sampling sampling, std::size_t count);
-    void (*sampleLinear)(std::uint8_t* to, const std::uint8_t* from, Sampling sampling, std::size_t count);
+    /// Completes a plan; may be null.
+    void (*planLinear)(LinearPlan& plan);
+    void (*sampleLinear)(std::uint8_t* to, const std::uint8_t* from, const LinearPlan& plan);
     void (*sampleBox)(std::uint8_t* to, const std::uint8_t* from, Sampling sampling, std::size_t count);
     /// The average of `run.count` rows; `rows` is parallel to the weights.
     void (*averageRows)(std::uint8_t* to, const std::uint8_t* const* rows, const BoxRun& run,

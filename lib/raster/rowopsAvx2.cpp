@@ -15,117 +15,6 @@ namespace avx2 {
 
 namespace {
 
-/// Pairs of weights (255 - w, w), a pair for each byte of a and b, that add up to 255. With the pixels' sign
-/// flipped every sum stays within a signed word, 255 * -128 to 255 * 127. The rounded high byte of such a sum
-/// is the result less 127.
-KX_AVX2 inline Vector blended(Vector a, Vector b, Vector lowWeights, Vector highWeights) {
-    const Vector flip = _mm256_set1_epi8(-128);
-    const Vector highByte = _mm256_set1_epi16(128);
-    a = _mm256_xor_si256(a, flip);
-    b = _mm256_xor_si256(b, flip);
-    const Vector low = _mm256_maddubs_epi16(lowWeights, _mm256_unpacklo_epi8(a, b));
-    const Vector high = _mm256_maddubs_epi16(highWeights, _mm256_unpackhi_epi8(a, b));
-    const Vector bytes =
-        _mm256_packs_epi16(_mm256_mulhrs_epi16(low, highByte), _mm256_mulhrs_epi16(high, highByte));
-    return _mm256_add_epi8(bytes, _mm256_set1_epi8(127));
-}
-
-KX_AVX2 void blend(std::uint8_t* to, const std::uint8_t* a, const std::uint8_t* b, std::uint8_t weight,
-                   std::size_t count) {
-    const Vector weights = _mm256_set1_epi16(static_cast<short>(255 - weight + weight * 256));
-    const auto bytes = static_cast<std::int64_t>(count) * 4;
-    std::int64_t at = 0;
-    for (; at + 2 * vectorBytes <= bytes; at += 2 * vectorBytes) {
-        const std::int64_t next = at + vectorBytes;
-        storePixels(to + at, blended(loadPixels(a + at, lanes), loadPixels(b + at, lanes), weights, weights),
-                    lanes);
-        storePixels(to + next,
-                    blended(loadPixels(a + next, lanes), loadPixels(b + next, lanes), weights, weights),
-                    lanes);
-    }
-    for (; at < bytes; at += vectorBytes) {
-        const std::int64_t left = (bytes - at) / 4;
-        storePixels(to + at, blended(loadPixels(a + at, left), loadPixels(b + at, left), weights, weights),
-                    left);
-    }
-}
-
-KX_AVX2 void fill(std::uint8_t* to, std::uint32_t word, std::int64_t count) {
-    const Vector pixels = _mm256_set1_epi32(static_cast<int>(word));
-    for (; count > 0; count -= lanes, to += vectorBytes)
-        storePixels(to, pixels, count);
-}
-
-/// Eight positions of an enlargement, relative to the pixel at the first one; they span eight pixels at most.
-struct Ramp {
-    Vector steps;
-    KX_AVX2 explicit Ramp(std::uint32_t step)
-        : steps(_mm256_mullo_epi32(_mm256_set1_epi32(static_cast<int>(step)),
-                                   _mm256_setr_epi32(0, 1, 2, 3, 4, 5, 6, 7))) {}
-    KX_AVX2 Vector at(std::int64_t position) const {
-        return _mm256_add_epi32(steps, _mm256_set1_epi32(static_cast<int>(position & 0xFFFF)));
-    }
-};
-
-/// Which two neighbours make each of eight pixels, and with which weights; both depend on the fraction of the
-/// first position only.
-struct Taps {
-    std::int64_t fraction = -1;
-    Vector indices;
-    Vector lowWeights;
-    Vector highWeights;
-
-    KX_AVX2 Taps()
-        : indices(_mm256_setzero_si256())
-        , lowWeights(indices)
-        , highWeights(indices) {}
-    KX_AVX2 void moveTo(std::int64_t position, const Ramp& ramp) {
-        // Steps of a power of two come back to the same fraction with every eight pixels.
-        if ((position & 0xFFFF) == fraction) return;
-        fraction = position & 0xFFFF;
-        const Vector positions = ramp.at(position);
-        indices = _mm256_srli_epi32(positions, 16);
-        const Vector byte = _mm256_set1_epi32(0xFF);
-        const Vector weight = _mm256_and_si256(_mm256_srli_epi32(positions, 8), byte);
-        // 255 - w in the low byte and w above it, twice.
-        const Vector pair = _mm256_add_epi32(byte, _mm256_sub_epi32(_mm256_slli_epi32(weight, 8), weight));
-        const Vector pairs = _mm256_or_si256(pair, _mm256_slli_epi32(pair, 16));
-        lowWeights = _mm256_unpacklo_epi32(pairs, pairs);
-        highWeights = _mm256_unpackhi_epi32(pairs, pairs);
-    }
-    KX_AVX2 Vector apply(Vector pixels, Vector next) const {
-        return blended(_mm256_permutevar8x32_epi32(pixels, indices),
-                       _mm256_permutevar8x32_epi32(next, indices), lowWeights, highWeights);
-    }
-};
-
-KX_AVX2 void sampleLinear(std::uint8_t* to, const std::uint8_t* from, Sampling s, std::size_t count) {
-    const std::int64_t last = s.sourceCount - 1;
-    const RowParts parts(s, static_cast<std::int64_t>(count));
-    fill(to, blendWords(load(from), load(from), 0), parts.before);
-    to += parts.before * 4;
-    std::int64_t position = s.position + parts.before * s.step;
-    const Ramp ramp(s.step);
-    Taps taps;
-    std::int64_t x = 0;
-    // All but the last groups have eight pixels and a next one to read.
-    for (; x + lanes <= parts.between && (position >> 16) + lanes <= last;
-         x += lanes, position += lanes * s.step) {
-        const std::uint8_t* const pixel = from + (position >> 16) * 4;
-        taps.moveTo(position, ramp);
-        storePixels(to + x * 4, taps.apply(loadPixels(pixel, lanes), loadPixels(pixel + 4, lanes)), lanes);
-    }
-    for (; x < parts.between; x += lanes, position += lanes * s.step) {
-        const std::int64_t left = last - (position >> 16);
-        const std::uint8_t* const pixel = from + (position >> 16) * 4;
-        taps.moveTo(position, ramp);
-        storePixels(to + x * 4, taps.apply(loadPixels(pixel, left + 1), loadPixels(pixel + 4, left)),
-                    parts.between - x);
-    }
-    const std::uint32_t end = load(from + last * 4);
-    fill(to + parts.between * 4, blendWords(end, end, 0), parts.after);
-}
-
 KX_AVX2 void enlargeNearest(std::uint8_t* to, const std::uint8_t* from, Sampling s, std::int64_t count) {
     const Ramp ramp(s.step);
     // Steps of a power of two come back to the same fraction with every eight pixels.
@@ -324,8 +213,8 @@ KX_AVX2 void averageRows(std::uint8_t* to, const std::uint8_t* const* rows, cons
 
 } // namespace
 
-extern constexpr RowOps rowOps{"AVX2", permute,       premultiply,  unpremultiply, multiply,
-                               blend,  sampleNearest, sampleLinear, sampleBox,     averageRows};
+extern constexpr RowOps rowOps{"AVX2",        permute,    premultiply,  unpremultiply, multiply,   blend,
+                               sampleNearest, planLinear, sampleLinear, sampleBox,     averageRows};
 
 } // namespace avx2
 

@@ -9,7 +9,7 @@ namespace raster::avx2 {
 namespace {
 
 /// The same bytes for each of the four pixels of a lane: byte i comes from map[i].
-KX_AVX2 inline Vector shuffleOf(const RasterChannelMap& map) {
+KX_AVX2_INLINE Vector shuffleOf(const RasterChannelMap& map) {
     std::uint32_t word = 0;
     std::memcpy(&word, &map, sizeof word);
     const Vector pixel = _mm256_set1_epi32(static_cast<int>(word));
@@ -18,7 +18,7 @@ KX_AVX2 inline Vector shuffleOf(const RasterChannelMap& map) {
 }
 
 /// (x + 127) / 255 for products of two bytes, exactly.
-KX_AVX2 inline Vector dividedBy255(Vector products) {
+KX_AVX2_INLINE Vector dividedBy255(Vector products) {
     return _mm256_mulhi_epu16(_mm256_add_epi16(products, _mm256_set1_epi16(128)), _mm256_set1_epi16(257));
 }
 
@@ -37,7 +37,7 @@ struct AlphaWords {
     KX_AVX2 Vector highOf(Vector pixels) const { return _mm256_shuffle_epi8(pixels, high); }
 };
 
-KX_AVX2 inline Vector alphaBytes(int alphaByte) {
+KX_AVX2_INLINE Vector alphaBytes(int alphaByte) {
     return _mm256_set1_epi32(static_cast<int>(0xFFU << (alphaByte * 8)));
 }
 
@@ -104,7 +104,7 @@ private:
 
 /// Writes pixels until the destination stands at a vector's boundary, where no store crosses two cache lines;
 /// the bytes written. None when no whole number of pixels leads there.
-KX_AVX2 inline std::int64_t storeUpToBoundary(std::uint8_t* to, const std::uint8_t* from, Vector shuffle) {
+KX_AVX2_INLINE std::int64_t storeUpToBoundary(std::uint8_t* to, const std::uint8_t* from, Vector shuffle) {
     const auto bytes = static_cast<std::int64_t>(-reinterpret_cast<std::uintptr_t>(to) % vectorBytes);
     if (bytes == 0 || bytes % 4 != 0) return 0;
     storePixels(to, _mm256_shuffle_epi8(loadPixels(from, bytes / 4), shuffle), bytes / 4);
@@ -141,7 +141,7 @@ KX_AVX2 void permuteShortRows(const RasterBlock& block, const std::uint8_t* from
 
 /// Pixels that are all opaque stay as they are, and those that are all clear become 0: most of an icon.
 template <typename Operation>
-KX_AVX2 inline void mapPixels(std::uint8_t* to, std::int64_t left, Vector alphaMask,
+KX_AVX2_INLINE void mapPixels(std::uint8_t* to, std::int64_t left, Vector alphaMask,
                               const Operation& operation) {
     const Vector pixels = loadPixels(to, left);
     if (_mm256_testnzc_si256(pixels, alphaMask))
@@ -151,7 +151,7 @@ KX_AVX2 inline void mapPixels(std::uint8_t* to, std::int64_t left, Vector alphaM
 }
 
 template <typename Operation>
-KX_AVX2 inline void mapRow(std::uint8_t* to, std::size_t count, int alphaByte, const Operation& operation) {
+KX_AVX2_INLINE void mapRow(std::uint8_t* to, std::size_t count, int alphaByte, const Operation& operation) {
     const Vector alphaMask = alphaBytes(alphaByte);
     auto left = static_cast<std::int64_t>(count);
     for (; left >= lanes; left -= lanes, to += vectorBytes)
@@ -222,7 +222,12 @@ KX_AVX2 void permute(const RasterBlock& block, const std::uint8_t* from, std::pt
 }
 
 KX_AVX2 void premultiply(std::uint8_t* pixels, std::size_t count, int alphaByte) {
-    mapRow(pixels, count, alphaByte, Premultiplication(alphaByte));
+    const Premultiplication premultiplied(alphaByte);
+    auto left = static_cast<std::int64_t>(count);
+#pragma GCC unroll 2
+    for (; left >= lanes; left -= lanes, pixels += vectorBytes)
+        storePixels(pixels, premultiplied(loadPixels(pixels, lanes)), lanes);
+    if (left > 0) storePixels(pixels, premultiplied(loadPixels(pixels, left)), left);
 }
 
 KX_AVX2 void unpremultiply(std::uint8_t* pixels, std::size_t count, int alphaByte) {

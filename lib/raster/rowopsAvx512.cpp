@@ -19,31 +19,36 @@ KX_AVX512 inline Vector flipped(Vector pixels) {
     return _mm512_xor_si512(pixels, _mm512_set1_epi8(-128));
 }
 
-KX_AVX512 inline Vector blendedRows(Vector above, Vector below, Vector weights) {
-    const Vector a = flipped(above);
-    const Vector b = flipped(below);
-    return blended(_mm512_maddubs_epi16(weights, _mm512_unpacklo_epi8(a, b)),
-                   _mm512_maddubs_epi16(weights, _mm512_unpackhi_epi8(a, b)));
+/// Sixteen pixels, or the first `left`, of each of `Rows` rows: what they have in common is done once.
+template <int Rows>
+KX_AVX512 inline void blendPixels(RasterRows<std::uint8_t> to, Vector a, Vector b, const Vector* weights,
+                                  std::int64_t left) {
+    const Vector low = _mm512_unpacklo_epi8(flipped(a), flipped(b));
+    const Vector high = _mm512_unpackhi_epi8(flipped(a), flipped(b));
+#pragma GCC unroll 4
+    for (int row = 0; row < Rows; ++row)
+        storePixels(
+            to.data + row * to.bytesPerRow,
+            blended(_mm512_maddubs_epi16(weights[row], low), _mm512_maddubs_epi16(weights[row], high)), left);
 }
 
-KX_AVX512 void blend(std::uint8_t* to, const std::uint8_t* a, const std::uint8_t* b, std::uint8_t weight,
-                     std::size_t count) {
-    const Vector weights = _mm512_set1_epi16(static_cast<short>(255 - weight + weight * 256));
-    const Vector one = _mm512_set1_epi8(1);
-    auto left = static_cast<std::int64_t>(count);
-    std::size_t at = 0;
-    // A weight of 0 leaves a * 255 >> 8.
-    if (weight == 0) {
-        for (; left > 0; left -= lanes, at += vectorBytes)
-            storePixels(to + at, _mm512_subs_epu8(loadPixels(a + at, left), one), left);
-        return;
-    }
-#pragma GCC unroll 2
-    for (; left >= lanes; left -= lanes, at += vectorBytes)
-        storePixels(to + at, blendedRows(loadPixels(a + at, lanes), loadPixels(b + at, lanes), weights),
-                    lanes);
-    if (left > 0)
-        storePixels(to + at, blendedRows(loadPixels(a + at, left), loadPixels(b + at, left), weights), left);
+template <int Rows>
+KX_AVX512 void blendRows(RasterRows<std::uint8_t> to, const std::uint8_t* a, const std::uint8_t* b,
+                         const std::uint8_t* weights, std::int64_t left) {
+    // 255 - w in the low byte and w above it.
+    Vector pairs[Rows];
+    for (int row = 0; row < Rows; ++row)
+        pairs[row] = _mm512_set1_epi16(static_cast<short>(weights[row] * 255 + 255));
+    for (; left >= lanes; left -= lanes, to.data += vectorBytes, a += vectorBytes, b += vectorBytes)
+        blendPixels<Rows>(to, loadPixels(a, lanes), loadPixels(b, lanes), pairs, lanes);
+    if (left > 0) blendPixels<Rows>(to, loadPixels(a, left), loadPixels(b, left), pairs, left);
+}
+
+KX_AVX512 void blend(RasterRows<std::uint8_t> to, const std::uint8_t* a, const std::uint8_t* b,
+                     std::span<const std::uint8_t> weights, std::size_t count) {
+    static constexpr decltype(&blendRows<1>) byNumber[] = {blendRows<1>, blendRows<2>, blendRows<3>,
+                                                           blendRows<4>};
+    byNumber[weights.size() - 1](to, a, b, weights.data(), static_cast<std::int64_t>(count));
 }
 
 KX_AVX512 void fill(std::uint8_t* to, std::uint32_t word, std::int64_t count) {
@@ -104,8 +109,9 @@ KX_AVX512 void enlargeLinear(std::uint8_t* to, const std::uint8_t* from, Samplin
     }
 }
 
-KX_AVX512 void sampleLinear(std::uint8_t* to, const std::uint8_t* from, Sampling s, std::size_t count) {
-    const RowParts parts(s, static_cast<std::int64_t>(count));
+KX_AVX512 void sampleLinear(std::uint8_t* to, const std::uint8_t* from, const LinearPlan& plan) {
+    Sampling s = plan.sampling;
+    const RowParts& parts = plan.parts;
     const std::uint32_t first = load(from);
     const std::uint32_t last = load(from + std::ptrdiff_t{s.sourceCount - 1} * 4);
     fill(to, blendWords(first, first, 0), parts.before);
@@ -253,7 +259,7 @@ KX_AVX512 void unpremultiply(std::uint8_t* pixels, std::size_t count, int alphaB
 
 } // namespace
 
-extern constexpr RowOps rowOps{"AVX-512", permute,       premultiply,  unpremultiply, multiply,
-                               blend,     sampleNearest, sampleLinear, sampleBox,     averageRows};
+extern constexpr RowOps rowOps{"AVX-512",     permute, premultiply,  unpremultiply, multiply,   blend,
+                               sampleNearest, nullptr, sampleLinear, sampleBox,     averageRows};
 
 } // namespace raster::avx512

@@ -25,7 +25,7 @@ constexpr Word words[] = {
     {SMCommand::quit, "agent.quit"},
 };
 
-constexpr platform::RemotePort::Timeouts patience{std::chrono::seconds(5), std::chrono::seconds(5)};
+constexpr platform::RemotePort::Timeouts patience{std::chrono::seconds(20), std::chrono::seconds(20)};
 
 } // namespace
 

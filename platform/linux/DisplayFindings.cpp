@@ -59,7 +59,7 @@ DisplayFindings LookAtDisplay() {
     if (bus.isConnected()) findings.hasNotifierHost = hasNotifierHost();
     if (!qGuiApp || !XcbConnection()) return findings;
     findings.answers = true;
-    findings.isUnderWayland = XcbHidesOtherWindows();
+    findings.isUnderWayland = XcbIsUnderWayland();
     findings.windowManager = windowManagerName();
     findings.hasTray = XcbFindTray() != 0;
     findings.isCompositing = XcbIsCompositing();

@@ -61,19 +61,22 @@ public:
     void makeKeyAndOrderFront() override {
         if (!isVisible()) {
             m_activeBefore = XcbActiveWindow();
+            m_focusBefore = XcbInputFocus();
             followCompositor();
         }
         place();
         m_view.show();
         m_view.raise();
-        m_view.activateWindow();
         m_view.windowHandle()->installEventFilter(this); // once, however often
-        XcbTakeInputFocus(nativeWindow());
+        takeKeyboard();
     }
 
     void orderOut() override {
         if (!isVisible()) return;
-        const bool isKey = XcbHasInputFocus(nativeWindow());
+        m_keyboard.reset();
+        const bool isKey = XcbInputFocus() == nativeWindow();
+        // Some window managers have not noticed that another had it, and would do nothing.
+        if (isKey) XcbSetInputFocus(m_focusBefore);
         m_view.hide();
         if (isKey) XcbActivateWindow(m_activeBefore);
     }
@@ -85,7 +88,7 @@ public:
 
     QImage screenBelow() const override {
         QScreen* screen = ScreenAt(m_view.geometry().center());
-        if (!screen || XcbHidesOtherWindows()) return {};
+        if (!screen || XcbIsUnderWayland()) return {};
         // The point past the right edge is not there to be seen.
         const QRect seen = m_view.geometry().intersected(screen->geometry());
         const QPoint corner = seen.topLeft() - screen->geometry().topLeft();
@@ -94,6 +97,14 @@ public:
 
 private:
     std::uint32_t nativeWindow() const { return static_cast<std::uint32_t>(m_view.winId()); }
+
+    void takeKeyboard() {
+        // A focus that a window takes by itself, some of Wayland's compositors take away again at once.
+        if (XcbIsUnderWayland()) m_keyboard = XcbGrabKeyboard(nativeWindow());
+        if (m_keyboard) return;
+        m_view.activateWindow();
+        XcbSetInputFocus(nativeWindow());
+    }
 
     /// Whether a window is see-through is decided when it is made, so it is made anew where that changed.
     void followCompositor() {
@@ -145,6 +156,8 @@ private:
     std::function<KXRect()> m_ownArea;
     KXRect m_frame;
     std::uint32_t m_activeBefore = 0;
+    std::uint32_t m_focusBefore = 0;
+    std::unique_ptr<Handle> m_keyboard;
     bool m_hasFilter = false;
 };
 

@@ -19,23 +19,21 @@ namespace {
 
 constexpr const char* blurBehind = "_KDE_NET_WM_BLUR_BEHIND_REGION";
 
-class TypingHold final : public Handle {
+class KeyboardGrab final : public Handle {
 public:
-    TypingHold() {
-        if (!m_connection) return;
-        // Refused while somebody else has it, as a window manager during its shortcuts: then we go without.
-        const auto cookie = xcb_grab_keyboard(m_connection, 0, XcbRootWindow(m_connection), XCB_CURRENT_TIME,
-                                              XCB_GRAB_MODE_ASYNC, XCB_GRAB_MODE_SYNC);
+    /// Refused while somebody else has it, as a window manager during its shortcuts: then we go without.
+    KeyboardGrab(xcb_window_t window, xcb_grab_mode_t mode) {
+        const auto cookie = xcb_grab_keyboard(m_connection, 0, window, XCB_CURRENT_TIME, XCB_GRAB_MODE_ASYNC,
+                                              static_cast<std::uint8_t>(mode));
         const XcbReply<xcb_grab_keyboard_reply_t> reply(
             xcb_grab_keyboard_reply(m_connection, cookie, nullptr));
     }
-    ~TypingHold() override {
-        if (!m_connection) return;
+    ~KeyboardGrab() override {
         xcb_ungrab_keyboard(m_connection, XCB_CURRENT_TIME);
         xcb_flush(m_connection);
     }
-    TypingHold(const TypingHold&) = delete;
-    TypingHold& operator=(const TypingHold&) = delete;
+    KeyboardGrab(const KeyboardGrab&) = delete;
+    KeyboardGrab& operator=(const KeyboardGrab&) = delete;
 
 private:
     xcb_connection_t* m_connection = XcbConnection();
@@ -72,7 +70,7 @@ void XcbBlurBehind(std::uint32_t window) {
     xcb_flush(c);
 }
 
-bool XcbHidesOtherWindows() {
+bool XcbIsUnderWayland() {
     auto* c = XcbConnection();
     if (!c) return true;
     constexpr char extension[] = "XWAYLAND";
@@ -88,30 +86,39 @@ std::uint32_t XcbActiveWindow() {
     return XcbWindowNamedByRoot("_NET_ACTIVE_WINDOW");
 }
 
-bool XcbHasInputFocus(std::uint32_t window) {
+std::uint32_t XcbInputFocus() {
     auto* c = XcbConnection();
-    if (!c) return false;
+    if (!c) return 0;
     const XcbReply<xcb_get_input_focus_reply_t> reply(
         xcb_get_input_focus_reply(c, xcb_get_input_focus(c), nullptr));
-    return reply && reply->focus == window;
+    return reply ? reply->focus : 0;
 }
 
 bool XcbHasInputFocus() {
     const auto windows = QGuiApplication::topLevelWindows();
-    return std::any_of(windows.begin(), windows.end(), [](const QWindow* window) {
-        return window->isVisible() && XcbHasInputFocus(static_cast<std::uint32_t>(window->winId()));
+    return std::any_of(windows.begin(), windows.end(), [focus = XcbInputFocus()](const QWindow* window) {
+        return window->isVisible() && focus == window->winId();
     });
 }
 
-void XcbTakeInputFocus(std::uint32_t window) {
+void XcbSetInputFocus(std::uint32_t window) {
     auto* c = XcbConnection();
     if (!c) return;
-    xcb_set_input_focus(c, XCB_INPUT_FOCUS_PARENT, window, XCB_CURRENT_TIME);
-    xcb_flush(c);
+    // Checked, though nothing can be done: the toolkit would report that the window has gone meanwhile.
+    const auto cookie = xcb_set_input_focus_checked(c, XCB_INPUT_FOCUS_PARENT, window, XCB_CURRENT_TIME);
+    const XcbReply<xcb_generic_error_t> error(xcb_request_check(c, cookie));
 }
 
 std::unique_ptr<Handle> XcbHoldTyping() {
-    return std::make_unique<TypingHold>();
+    auto* c = XcbConnection();
+    // Wayland's X server would hold nothing back of what is typed elsewhere.
+    if (!c || XcbIsUnderWayland()) return nullptr;
+    return std::make_unique<KeyboardGrab>(XcbRootWindow(c), XCB_GRAB_MODE_SYNC);
+}
+
+std::unique_ptr<Handle> XcbGrabKeyboard(std::uint32_t window) {
+    if (!XcbConnection()) return nullptr;
+    return std::make_unique<KeyboardGrab>(window, XCB_GRAB_MODE_ASYNC);
 }
 
 void XcbActivateWindow(std::uint32_t window) {

@@ -16,18 +16,23 @@ bool XcbIsCompositing();
 bool XcbAnnouncesBlurBehind();
 /// Asks it to, behind the whole window.
 void XcbBlurBehind(std::uint32_t window);
-/// Whether a picture of the screen would be black: true under Wayland's X server.
-bool XcbHidesOtherWindows();
+/// Whether this is Wayland's X server: a picture of the screen would be black, and the keyboard's focus is
+/// the compositor's.
+bool XcbIsUnderWayland();
 
 /// The window that the window manager counts as active; 0 for none.
 std::uint32_t XcbActiveWindow();
-bool XcbHasInputFocus(std::uint32_t window);
+/// The window that has the keyboard; 0 for none, 1 for the one under the pointer.
+std::uint32_t XcbInputFocus();
 /// Whether any visible window of this process has the keyboard.
 bool XcbHasInputFocus();
-void XcbTakeInputFocus(std::uint32_t window);
+/// Gives the window the keyboard, if it can be seen.
+void XcbSetInputFocus(std::uint32_t window);
 /// Until the handle ends no key event reaches any program; then those that wait go to the window that has the
-/// keyboard. For moments only.
+/// keyboard. For moments only. Null where that cannot be had.
 std::unique_ptr<Handle> XcbHoldTyping();
+/// All keys go to the window until the handle ends, whoever has the focus. The window must be seen.
+std::unique_ptr<Handle> XcbGrabKeyboard(std::uint32_t window);
 /// Asks the window manager to make the window active again.
 void XcbActivateWindow(std::uint32_t window);
 

@@ -53,7 +53,8 @@ function(kx_program name)
 endfunction()
 
 # kx_test(name SOURCES … LINKS … [GUI]): one test program, run as one CTest test. With GUI it may load font and
-# theme libraries, which leave things allocated until the process ends: leaks are not looked for then.
+# theme libraries, which leave things allocated until the process ends: leaks are not looked for then. A refused
+# allocation is null under the sanitizers too.
 function(kx_test name)
     cmake_parse_arguments(ARG "MOC;GUI" "" "SOURCES;LINKS" ${ARGN})
     set(leaks 1)
@@ -65,8 +66,9 @@ function(kx_test name)
     set_target_properties(${name} PROPERTIES AUTOMOC ${ARG_MOC}
         RUNTIME_OUTPUT_DIRECTORY ${CMAKE_BINARY_DIR}/tests)
     add_test(NAME ${name} COMMAND ${name})
-    set_tests_properties(${name} PROPERTIES TIMEOUT 120 ENVIRONMENT
-        "QT_QPA_PLATFORM=offscreen;ASAN_OPTIONS=detect_leaks=${leaks};KX_TEST_BIN=${CMAKE_BINARY_DIR}/bin")
+    set(environment QT_QPA_PLATFORM=offscreen KX_TEST_BIN=${CMAKE_BINARY_DIR}/bin
+        ASAN_OPTIONS=detect_leaks=${leaks}:allocator_may_return_null=1 TSAN_OPTIONS=allocator_may_return_null=1)
+    set_tests_properties(${name} PROPERTIES TIMEOUT 120 ENVIRONMENT "${environment}")
 endfunction()
 
 # kx_translations(target name): the texts of the folder in each language, from translations/<name>_<language>.ts.

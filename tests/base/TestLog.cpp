@@ -14,11 +14,6 @@
 
 namespace fs = std::filesystem;
 
-/// Lets a refused allocation answer null under the address sanitizer, as malloc does without it.
-extern "C" const char* __asan_default_options() {
-    return "allocator_may_return_null=1";
-}
-
 namespace {
 
 void put(const std::string& path, const std::string& text) {

@@ -1,6 +1,5 @@
 #include "app/SMMenuWindowController.h"
 
-#include "app/SMIsEqual.h"
 #include "app/SMMenuButton.h"
 #include "app/SMMenuCollectionView.h"
 #include "app/SMMenuItem.h"
@@ -11,6 +10,7 @@
 #include "app/menuHomeList.h"
 #include "app/menuRow.h"
 #include "lib/base/Geometry.h"
+#include "lib/base/IsEqual.h"
 #include "lib/base/KXNotificationCenter.h"
 
 #include <QCoreApplication>
@@ -217,13 +217,13 @@ void SMMenuWindowController::selectMenuItem(const SMMenuItem::Pointer& item,
 
 void SMMenuWindowController::openFolder(const SMMenuItem::Pointer& folder,
                                         const SMMenuButton::Pointer& button) {
-    if (SMIsEqual(m_currentMenuButton, button)) {
+    if (KXIsEqual(m_currentMenuButton, button)) {
         selectMenuItem(nullptr, nullptr);
         return;
     }
     if (m_currentMenu && m_currentMenu->hasChildItem(folder.get())) {
         SMMenuCollectionView& list = *m_rightMenuCollectionView;
-        if (SMIsEqual(list.expandedMenuItem(), folder)) {
+        if (KXIsEqual(list.expandedMenuItem(), folder)) {
             list.setExpandedMenuItem(folder->parent());
             return;
         }

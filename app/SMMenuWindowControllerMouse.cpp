@@ -1,12 +1,12 @@
 // The one highlighted row, as the mouse and the wheel move it.
 
-#include "app/SMIsEqual.h"
 #include "app/SMMenuButton.h"
 #include "app/SMMenuItem.h"
 #include "app/SMMenuModel.h"
 #include "app/SMMenuWindowController.h"
 #include "app/SMMenuWindowOutlets.h"
 #include "lib/base/Geometry.h"
+#include "lib/base/IsEqual.h"
 
 #include <chrono>
 #include <cmath>
@@ -50,7 +50,7 @@ void SMMenuWindowController::updateMouseOverState(KXPoint point) {
 }
 
 void SMMenuWindowController::changeMouseOverButtonTo(const SMMenuButton::Pointer& button) {
-    if (SMIsEqual(button, m_currentMouseOverMenuButton)) return;
+    if (KXIsEqual(button, m_currentMouseOverMenuButton)) return;
     const auto old = std::exchange(m_currentMouseOverMenuButton, nullptr);
     if (old) old->setHasMouseOver(false);
     m_currentMouseOverMenuButton = button;
@@ -59,7 +59,7 @@ void SMMenuWindowController::changeMouseOverButtonTo(const SMMenuButton::Pointer
 
 void SMMenuWindowController::onMenuCollectionViewDidUpdate(const void* list) {
     const auto current = m_currentMouseOverMenuButton;
-    if (SMIsEqual(current, m_actionButton)) return;
+    if (KXIsEqual(current, m_actionButton)) return;
     if (current && current->menuItem()) {
         const SMMenuItem* item = current->menuItem().get();
         auto button = m_leftMenuCollectionView.findButtonForMenuItem(item);

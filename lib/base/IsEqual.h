@@ -1,9 +1,8 @@
 #pragma once
 
-#include <optional>
-
-/// Whether both are there and equal. Two absent values are not equal: nobody is asked, so nobody says yes.
-template <class T>
-bool KXIsEqual(const std::optional<T>& a, const std::optional<T>& b) {
-    return a && b && *a == *b;
+/// Whether both are there and equal: strings by their text, pointers when they point at the same object. Two
+/// absent ones are not equal: nobody is asked, so nobody says yes.
+template <class Optional>
+bool KXIsEqual(const Optional& a, const Optional& b) {
+    return a && a == b;
 }

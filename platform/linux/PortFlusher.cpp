@@ -1,16 +1,19 @@
 #include "platform/linux/PortFlusher.h"
+
+#include "lib/base/Log.h"
 #include "platform/Clock.h"
 #include "platform/linux/Destination.h"
 
+#include <algorithm>
 #include <chrono>
+#include <climits>
 #include <memory>
 #include <mutex>
 #include <optional>
 #include <poll.h>
 #include <sys/eventfd.h>
-
-#include <algorithm>
-#include <climits>
+#include <system_error>
+#include <thread>
 #include <utility>
 #include <vector>
 
@@ -43,10 +46,16 @@ PortFlusher::~PortFlusher() {
 void PortFlusher::add(std::shared_ptr<Destination> destination) {
     const std::lock_guard lock(m_mutex);
     m_added.push_back(std::move(destination));
-    if (!m_thread.joinable())
-        m_thread = std::thread([this] { run(); });
-    else
+    if (m_thread.joinable()) {
         eventfd_write(m_wake.get(), 1);
+        return;
+    }
+    try {
+        m_thread = std::thread([this] { run(); });
+    } catch (const std::system_error& error) {
+        // What waits is given up when it is overdue; the message after it tries again.
+        Warning("Cannot start the thread that sends: %s\n", error.what());
+    }
 }
 
 void PortFlusher::run() {

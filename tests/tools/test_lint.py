@@ -59,9 +59,10 @@ class LintTest(unittest.TestCase):
             self.assertIn(word, fault[2])
 
     def test_a_clean_tree_passes(self):
-        output, faults = self.lint({})
+        output, faults = self.lint({"tools/run": "#!/bin/sh\n# why\nrun\n"})
         self.assertEqual(faults, [])
         self.assertRegex(output, r"all code +13\n")
+        self.assertRegex(output, r"scripts +1\n")
         self.assertRegex(output, r"tests for a line of code 0\.15\n")
 
     def test_includes(self):

@@ -1,13 +1,13 @@
 #include "server/Options.h"
 
+#include "lib/base/ParseNumber.h"
+
 #include <algorithm>
-#include <charconv>
 #include <cstddef>
 #include <iterator>
 #include <optional>
 #include <span>
 #include <string_view>
-#include <system_error>
 
 namespace tessel {
 namespace {
@@ -25,10 +25,7 @@ constexpr Flag flags[] = {
 };
 
 bool ReadIndex(std::string_view text, Options& options) {
-    std::size_t index = 0;
-    const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), index);
-    options.select = index;
-    return error == std::errc() && end == text.data() + text.size();
+    return ParseNumber(text, options.select.emplace());
 }
 
 bool ReadRecord(std::string_view text, Options& options) {

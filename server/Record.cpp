@@ -2,12 +2,15 @@
 
 #include "lib/base/Log.h"
 #include "lib/ipc/KXIPCMessage.h"
+#include "lib/plist/JSON.h"
 #include "lib/plist/Value.h"
 
+#include <algorithm>
 #include <cerrno>
 #include <cstdio>
 #include <cstring>
 #include <string>
+#include <string_view>
 
 namespace tessel {
 namespace {
@@ -17,25 +20,11 @@ constexpr std::size_t maxText = 200; // of one string, in bytes
 constexpr std::size_t maxElements = 32;
 constexpr int maxDepth = 2;
 
-std::string Quoted(std::string text) {
-    if (text.size() > maxText) {
-        std::size_t end = maxText;
-        while (end > 0 && (static_cast<unsigned char>(text[end]) & 0xC0) == 0x80)
-            --end; // the middle of a character
-        text.resize(end);
-    }
-    std::string quoted = "\"";
-    for (const char character : text) {
-        char escape[8];
-        std::snprintf(escape, sizeof escape, "\\u%04x", unsigned{static_cast<unsigned char>(character)});
-        if (static_cast<unsigned char>(character) < 0x20)
-            quoted += escape;
-        else if (character == '"' || character == '\\')
-            (quoted += '\\') += character;
-        else
-            quoted += character;
-    }
-    return quoted + '"';
+std::string Quoted(std::string_view text) {
+    std::size_t end = std::min(text.size(), maxText);
+    while (end > 0 && end < text.size() && (static_cast<unsigned char>(text[end]) & 0xC0) == 0x80)
+        --end; // the middle of a character
+    return plist::QuotedJSON(text.substr(0, end));
 }
 
 std::string Json(const plist::Value& value, int depth);

@@ -1,7 +1,8 @@
 #include "tools/kxipcArguments.h"
 
+#include "lib/base/ParseNumber.h"
+
 #include <algorithm>
-#include <charconv>
 #include <cstddef>
 #include <iterator>
 #include <limits>
@@ -31,9 +32,7 @@ constexpr Form forms[] = {
 };
 
 bool readSpeed(const std::string& text, double& speed) {
-    const char* end = text.data() + text.size();
-    const auto result = std::from_chars(text.data(), end, speed);
-    return result.ec == std::errc() && result.ptr == end && speed >= 0 && speed <= 1e6;
+    return ParseNumber(text, speed) && speed >= 0 && speed <= 1e6;
 }
 
 /// Takes the option's value, if it has one. False when it makes no sense.

@@ -1,26 +1,11 @@
 #include "tools/kxipcJson.h"
 
+#include "lib/plist/JSON.h"
+
 #include <charconv>
 #include <cmath>
-#include <cstdio>
 
 namespace {
-
-std::string quoted(const std::string& text) {
-    std::string result = "\"";
-    for (const char character : text) {
-        if (character == '"' || character == '\\') {
-            result += {'\\', character};
-        } else if (static_cast<unsigned char>(character) < 0x20) {
-            char escape[8];
-            std::snprintf(escape, sizeof escape, "\\u%04x", static_cast<unsigned>(character));
-            result += escape;
-        } else {
-            result += character;
-        }
-    }
-    return result + '"';
-}
 
 std::string number(double value) {
     if (!std::isfinite(value)) return "null";
@@ -38,7 +23,7 @@ std::string container(const plist::Value& value) {
     std::string result(1, isDictionary ? '{' : '[');
     for (std::size_t i = 0; i < value.size(); ++i) {
         if (i > 0) result += ',';
-        if (isDictionary) result += quoted(value.keyAt(i)) + ':';
+        if (isDictionary) result += plist::QuotedJSON(value.keyAt(i)) + ':';
         result += KxipcJson(value.at(i));
     }
     return result + (isDictionary ? '}' : ']');
@@ -61,7 +46,7 @@ std::string KxipcJson(const plist::Value& value) {
     case plist::Type::data:
         return "\"<" + std::to_string(value.data().size()) + " bytes>\"";
     case plist::Type::string:
-        return quoted(value.stringOr(""));
+        return plist::QuotedJSON(value.stringOr(""));
     case plist::Type::array:
     case plist::Type::dictionary:
         return container(value);

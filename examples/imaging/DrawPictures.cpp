@@ -4,6 +4,7 @@
 #include "lib/kxAppKit/KXColor.h"
 #include "lib/kxAppKit/KXGeometry.h"
 #include "lib/kxAppKit/KXImage.h"
+#include "lib/kxAppKit/KXQtGeometry.h"
 #include "lib/plist/Value.h"
 
 #include <QGuiApplication>
@@ -14,11 +15,6 @@
 // build/release/bin/drawImagingPictures docs/images
 
 namespace {
-
-QRectF toRect(const KXRect& r) {
-    return {static_cast<qreal>(r.x), static_cast<qreal>(r.y), static_cast<qreal>(r.width),
-            static_cast<qreal>(r.height)};
-}
 
 QImage canvas(int width, int height) {
     QImage image(width, height, QImage::Format_ARGB32_Premultiplied);
@@ -110,7 +106,7 @@ QImage shapes() {
     KXBezierPath::bezierPathWithRoundRect({0, 0, 10, 20}, 3).fill(painter, Qt::darkGreen);
     painter.resetTransform();
     painter.setPen(Qt::gray);
-    painter.drawRect(toRect(cell));
+    painter.drawRect(KXQtRect(cell));
     return picture;
 }
 

@@ -2,6 +2,7 @@
 
 #include "lib/base/Geometry.h"
 #include "lib/kxAppKit/KXGeometry.h"
+#include "lib/kxAppKit/KXQtGeometry.h"
 
 #include <QLinearGradient>
 #include <QPainter>
@@ -12,15 +13,6 @@
 #include <numbers>
 
 namespace {
-
-QPointF toPoint(KXPoint p) {
-    return {static_cast<qreal>(p.x), static_cast<qreal>(p.y)};
-}
-
-QRectF toRect(const KXRect& r) {
-    return {static_cast<qreal>(r.x), static_cast<qreal>(r.y), static_cast<qreal>(r.width),
-            static_cast<qreal>(r.height)};
-}
 
 /// What the painter may still paint on, in its own coordinates.
 QRectF paintableArea(const QPainter& painter) {
@@ -98,11 +90,11 @@ void KXBezierPath::linearGradientFill(QPainter& painter, const KXRect& rect, con
 }
 
 void KXBezierPath::moveTo(KXPoint point) {
-    m_path.moveTo(toPoint(point));
+    m_path.moveTo(KXQtPoint(point));
 }
 
 void KXBezierPath::lineTo(KXPoint point) {
-    m_path.lineTo(toPoint(point));
+    m_path.lineTo(KXQtPoint(point));
 }
 
 void KXBezierPath::relativeLineTo(float dx, float dy) {
@@ -116,7 +108,7 @@ void KXBezierPath::appendArc(KXPoint center, float radius, float startAngle, flo
     const int pieces = std::max(1, static_cast<int>(std::ceil(std::fabs(endAngle - startAngle) / 90)));
     const double sweep = static_cast<double>(endAngle - startAngle) * radians / pieces;
     const double handle = 4.0 / 3.0 * std::tan(sweep / 4);
-    const QPointF c = toPoint(center);
+    const QPointF c = KXQtPoint(center);
     const auto r = static_cast<double>(radius);
     double angle = static_cast<double>(startAngle) * radians;
     QPointF from = unit(angle);
@@ -157,7 +149,7 @@ void KXBezierPath::strokeInside(QPainter& painter, const QColor& color) const {
 void KXBezierPath::strokeInsideWithinRect(QPainter& painter, const QColor& color, const KXRect& rect) const {
     painter.save();
     painter.setClipPath(m_path, Qt::IntersectClip);
-    if (rect.width > 0 && rect.height > 0) painter.setClipRect(toRect(rect), Qt::IntersectClip);
+    if (rect.width > 0 && rect.height > 0) painter.setClipRect(KXQtRect(rect), Qt::IntersectClip);
     KXBezierPath doubled = *this;
     doubled.setLineWidth(2 * m_lineWidth);
     doubled.stroke(painter, color);

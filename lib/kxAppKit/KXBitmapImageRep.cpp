@@ -4,6 +4,7 @@
 #include "lib/base/Log.h"
 #include "lib/base/SharedBytes.h"
 #include "lib/kxAppKit/KXImageRep.h"
+#include "lib/kxAppKit/KXQtGeometry.h"
 #include "lib/kxAppKit/KXTiff.h"
 #include "lib/raster/rasterops.h"
 
@@ -231,8 +232,7 @@ QImage KXBitmapImageRep::premultipliedImage() const {
 }
 
 void KXBitmapImageRep::drawInRect(QPainter& painter, const KXRect& rect) const {
-    const QRectF target(static_cast<qreal>(rect.x), static_cast<qreal>(rect.y),
-                        static_cast<qreal>(rect.width), static_cast<qreal>(rect.height));
+    const QRectF target = KXQtRect(rect);
     QImage image = imageView();
     if (image.isNull()) image = premultipliedImage();
     const QSizeF device = painter.deviceTransform().mapRect(target).size();

@@ -4,6 +4,7 @@
 #include "lib/kxAppKit/KXGeometry.h"
 #include "lib/kxAppKit/KXImage.h"
 #include "lib/kxAppKit/KXImageRep.h"
+#include "lib/kxAppKit/KXQtGeometry.h"
 
 #include <QPainter>
 #include <cmath>
@@ -11,11 +12,6 @@
 #include <string>
 
 namespace {
-
-QRectF toRect(const KXRect& r) {
-    return {static_cast<qreal>(r.x), static_cast<qreal>(r.y), static_cast<qreal>(r.width),
-            static_cast<qreal>(r.height)};
-}
 
 KXRect wholeOf(KXSize size) {
     return {0, 0, size.width, size.height};
@@ -58,8 +54,7 @@ KXImage::Pointer KXImage::imageWithCIImage(const KXExtentImage* image) {
     return imageDrawnBy(size, KXImageInterpolation::standard, [&](QPainter& painter) {
         painter.setCompositionMode(QPainter::CompositionMode_Source);
         // Not at the corner, which would look right: the picture keeps the place that its extent says.
-        painter.drawImage(QPointF(static_cast<qreal>(image->origin.x), static_cast<qreal>(-image->origin.y)),
-                          image->image);
+        painter.drawImage(KXQtPoint({image->origin.x, -image->origin.y}), image->image);
     });
 }
 
@@ -100,7 +95,7 @@ KXImage::Pointer KXImage::selectedImage() const {
     return imageDrawnBy(m_size, KXImageInterpolation::standard, [&](QPainter& painter) {
         drawInRect(painter, wholeOf(m_size), {}, KXCompositingOperation::copy, 1);
         painter.setCompositionMode(modeOf(KXCompositingOperation::sourceAtop));
-        painter.fillRect(toRect(wholeOf(m_size)), QColor::fromRgbF(0, 0, 0, 0.35f));
+        painter.fillRect(KXQtRect(wholeOf(m_size)), QColor::fromRgbF(0, 0, 0, 0.35f));
     });
 }
 
@@ -118,7 +113,7 @@ KXImage::Pointer KXImage::imageByApplyingOverlay(const KXImage& overlay) const {
 
 void KXImage::drawInRect(QPainter& painter, const KXRect& rect, const KXRect& fromRect,
                          KXCompositingOperation operation, float fraction) const {
-    const QSizeF device = painter.deviceTransform().mapRect(toRect(rect)).size();
+    const QSizeF device = painter.deviceTransform().mapRect(KXQtRect(rect)).size();
     const KXImageRep::Pointer rep =
         bestImageRepForSize({static_cast<float>(device.width()), static_cast<float>(device.height())});
     if (!rep) return;
@@ -132,7 +127,7 @@ void KXImage::drawInRect(QPainter& painter, const KXRect& rect, const KXRect& fr
         const float top = m_flipped ? fromRect.y : m_size.height - fromRect.maxY();
         whole = {rect.x - fromRect.x * scaleX, rect.y - top * scaleY, m_size.width * scaleX,
                  m_size.height * scaleY};
-        painter.setClipRect(toRect(rect), Qt::IntersectClip);
+        painter.setClipRect(KXQtRect(rect), Qt::IntersectClip);
     }
     rep->drawInRect(painter, whole);
     painter.restore();

@@ -1,14 +1,14 @@
 #include "lib/plist/Scalars.h"
+
+#include "lib/base/ParseNumber.h"
 #include "lib/plist/Value.h"
 
 #include <array>
-#include <charconv>
 #include <chrono>
 #include <cstddef>
 #include <cstdint>
 #include <memory>
 #include <string_view>
-#include <system_error>
 #include <utility>
 #include <vector>
 
@@ -31,13 +31,6 @@ bool take(std::string_view& text, std::string_view prefix) {
     return true;
 }
 
-template <class Number, class... Format>
-bool readWhole(std::string_view text, Number& number, Format... format) {
-    const char* end = text.data() + text.size();
-    const auto [stop, error] = std::from_chars(text.data(), end, number, format...);
-    return error == std::errc() && stop == end;
-}
-
 /// 0 to 63; more than that for what is no digit of base64.
 constexpr auto kDigits64 = [] {
     std::array<unsigned char, 256> digits{};
@@ -57,7 +50,7 @@ Value integerFromText(std::string_view text) {
     if (!negative) take(text, "+");
     const int base = take(text, "0x") || take(text, "0X") ? 16 : 10;
     std::uint64_t number = 0;
-    if (!readWhole(text, number, base)) return {};
+    if (!ParseNumber(text, number, base)) return {};
     if (!negative) return number;
     if (number > std::uint64_t{1} << 63) return {};
     return static_cast<std::int64_t>(0 - number);
@@ -67,7 +60,7 @@ Value realFromText(std::string_view text) {
     text = trimmed(text);
     if (take(text, "+") && text.starts_with('-')) return {};
     double number = 0;
-    return readWhole(text, number) ? Value(number) : Value();
+    return ParseNumber(text, number) ? Value(number) : Value();
 }
 
 Value dateFromText(std::string_view text) {
@@ -81,7 +74,7 @@ Value dateFromText(std::string_view text) {
     }
     const auto number = [&](std::size_t at, std::size_t size) {
         int value = 0;
-        readWhole(text.substr(at, size), value);
+        ParseNumber(text.substr(at, size), value);
         return value;
     };
     const year_month_day day{year(number(0, 4)), month(static_cast<unsigned>(number(5, 2))),

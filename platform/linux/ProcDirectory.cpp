@@ -1,11 +1,11 @@
 #include "platform/linux/ProcDirectory.h"
 
+#include "lib/base/ParseNumber.h"
 #include "platform/linux/ProcRecords.h"
 #include "platform/linux/SmallFile.h"
 
 #include <algorithm>
 #include <array>
-#include <charconv>
 #include <cstddef>
 #include <dirent.h>
 #include <fcntl.h>
@@ -15,7 +15,6 @@
 #include <string>
 #include <string_view>
 #include <sys/stat.h>
-#include <system_error>
 #include <unistd.h>
 #include <vector>
 
@@ -27,8 +26,7 @@ constexpr std::size_t largestRecord = 4096;
 
 int ProcessID(std::string_view name) {
     int pid = 0;
-    const auto [end, error] = std::from_chars(name.data(), name.data() + name.size(), pid);
-    return error == std::errc() && end == name.data() + name.size() ? pid : 0;
+    return ParseNumber(name, pid) ? pid : 0;
 }
 
 } // namespace

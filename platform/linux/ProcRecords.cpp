@@ -1,12 +1,12 @@
 #include "platform/linux/ProcRecords.h"
 
-#include <charconv>
+#include "lib/base/ParseNumber.h"
+
 #include <cstddef>
 #include <functional>
 #include <optional>
 #include <string>
 #include <string_view>
-#include <system_error>
 #include <vector>
 
 namespace platform {
@@ -19,12 +19,6 @@ std::vector<std::string_view> Split(std::string_view text, char separator) {
         parts.push_back(text.substr(0, end));
     parts.push_back(text);
     return parts;
-}
-
-template <typename Number, typename... Base>
-bool ParseNumber(std::string_view text, Number& number, Base... base) {
-    const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), number, base...);
-    return error == std::errc() && end == text.data() + text.size();
 }
 
 bool RemoveSuffix(std::string_view& text, std::string_view suffix) {

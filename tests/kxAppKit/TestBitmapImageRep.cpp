@@ -1,4 +1,5 @@
 #include "lib/kxAppKit/KXBitmapImageRep.h"
+#include "lib/kxAppKit/KXQtGeometry.h"
 #include "tests/support/ScratchHome.h"
 
 #include <QPainter>
@@ -6,10 +7,6 @@
 #include <gtest/gtest.h>
 #include <limits>
 #include <vector>
-
-extern "C" const char* __asan_default_options() {
-    return "allocator_may_return_null=1";
-}
 
 namespace {
 
@@ -31,14 +28,11 @@ Bytes pixelAt(const Bitmap& from, int x, int y) {
 
 /// Exactly one entry, with this text in it.
 void expectLogged(const std::string& text) {
-    const std::string log = ScratchHome::log();
-    EXPECT_EQ(std::count(log.begin(), log.end(), '\n'), 1) << log;
-    EXPECT_NE(log.find(text), std::string::npos) << log << " lacks " << text;
+    EXPECT_EQ(ScratchHome::logged("\n"), 1) << ScratchHome::log();
+    EXPECT_EQ(ScratchHome::logged(text), 1) << ScratchHome::log() << " lacks " << text;
 }
 
 TEST(Bitmap, CreationChecksItsParameters) {
-    constexpr auto method = "+[NSBitmapImageRep(KXAppKitAdditions) "
-                            "imageRepWith32bitBuffer:pixelsWide:pixelsHigh:bitmapFormat:bytesPerRow:]: ";
     Bytes memory(64, 9);
     const struct {
         std::uint8_t* buffer;
@@ -47,7 +41,9 @@ TEST(Bitmap, CreationChecksItsParameters) {
         int bytesPerRow;
         const char* complaint;
     } cases[] = {
-        {memory.data(), 4, 4, 0, 0, "invalid bitmap creation parameters: buffer=0x"},
+        {memory.data(), 4, 4, 0, 0,
+         "imageRepWith32bitBuffer:pixelsWide:pixelsHigh:bitmapFormat:bytesPerRow:]: invalid bitmap creation "
+         "parameters: buffer=0x"},
         {memory.data(), 4, 4, 0, 15, ", width=4, height=4, format=0, bytesPerRow=15\n"},
         {nullptr, 4, 4, 0, 15, "invalid bitmap creation parameters: buffer=(nil)"},
         {nullptr, 0, 4, 0, 0, "invalid"},
@@ -64,7 +60,6 @@ TEST(Bitmap, CreationChecksItsParameters) {
     for (const auto& c : cases) {
         const ScratchHome home;
         EXPECT_FALSE(Bitmap::imageRepWith32bitBuffer(c.buffer, c.wide, c.high, c.format, c.bytesPerRow));
-        expectLogged(method);
         expectLogged(c.complaint);
     }
     const auto own = bitmap(3, 2);
@@ -84,11 +79,8 @@ TEST(Bitmap, IconBuffersAreFlippedAndReordered) {
         << "rows follow one another, whatever their length is said to be";
     const ScratchHome home;
     EXPECT_FALSE(Bitmap::imageRepFromFlippedBGRABuffer(rows.data(), 0x40000001, 1, 4));
-    expectLogged("+[NSBitmapImageRep(KXAppKitAdditions) "
-                 "imageRepFromFlippedBGRABuffer:pixelsWide:pixelsHigh:bytesPerRow:]"
-                 ": invalid BGRA bitmap parameters: buffer=0x");
+    expectLogged("pixelsWide:pixelsHigh:bytesPerRow:]: invalid BGRA bitmap parameters: buffer=0x");
     EXPECT_FALSE(Bitmap::imageRepFromFlippedBGRABuffer(nullptr, 1, 1, 4));
-    EXPECT_FALSE(Bitmap::imageRepFromFlippedBGRABuffer(rows.data(), 2, 0, 8));
     EXPECT_FALSE(Bitmap::imageRepFromFlippedBGRABuffer(rows.data(), 65536, 65537, 65536 * 4));
 }
 
@@ -110,9 +102,7 @@ TEST(Bitmap, ConvertsBetweenItsLayouts) {
     const ScratchHome home;
     EXPECT_FALSE(bitmap(1, 1)->convertBitmapDataFromFormat(4, 4))
         << "checks come before the test for equality";
-    expectLogged("-[NSBitmapImageRep(KXAppKitAdditions) convertBitmapDataFromFormat:toFormat:]: invalid "
-                 "bitmap conversion "
-                 "parameters: srcFormat=4, dstFormat=4, bitmap: ");
+    expectLogged(": invalid bitmap conversion parameters: srcFormat=4, dstFormat=4, bitmap: ");
     EXPECT_FALSE(Bitmap::imageRepWithPixels(2, 2, 24)->convertBitmapDataFromFormat(0, 1));
 }
 
@@ -135,9 +125,7 @@ TEST(Bitmap, CopiesBlocksFromTheBottomLeft) {
     }
     const ScratchHome home;
     EXPECT_FALSE(source->copyBitmapDataIntoRep(*bitmap(8, 8), {0.5f, 0}));
-    expectLogged("-[NSBitmapImageRep(KXAppKitAdditions) copyBitmapDataIntoRep:offset:]: invalid bitmap copy "
-                 "parameters: "
-                 "offset={0.5, 0}, source=");
+    expectLogged(": invalid bitmap copy parameters: offset={0.5, 0}, source=");
     EXPECT_FALSE(source->copyBitmapDataIntoRep(*source, {}));
     EXPECT_FALSE(source->copyBitmapDataIntoRep(*bitmap(8, 8), {std::numeric_limits<float>::infinity(), 0}));
     EXPECT_FALSE(source->copyBitmapDataIntoRep(*Bitmap::imageRepWithPixels(8, 8, 24), {}));
@@ -153,9 +141,7 @@ TEST(Bitmap, MultipliesOnlyWhatItCovers) {
     const ScratchHome home;
     target->setColorSpaceName("NSDeviceRGBColorSpace");
     EXPECT_FALSE(black->multiplyPixelDataIntoBitmapRep(*target, {}));
-    expectLogged(
-        "-[NSBitmapImageRep(KXAppKitAdditions) multiplyPixelDataIntoBitmapRep:offset:]: invalid parameters: "
-        "offset={0, 0}, source=");
+    expectLogged("multiplyPixelDataIntoBitmapRep:offset:]: invalid parameters: offset={0, 0}, source=");
 }
 
 TEST(Bitmap, EnlargesOnlyOntoTheWholeOfItsLike) {
@@ -173,9 +159,7 @@ TEST(Bitmap, EnlargesOnlyOntoTheWholeOfItsLike) {
     for (const auto& c : refused) {
         const ScratchHome home;
         EXPECT_FALSE(c.source->drawWithBilinearScalingIntoBitmapRep(*c.target, c.rect));
-        expectLogged("-[NSBitmapImageRep(KXAppKitAdditions) "
-                     "drawWithBilinearScalingIntoBitmapRep:targetRect:]: invalid "
-                     "bitmap scale parameters: rect={{0, 0}, ");
+        expectLogged("IntoBitmapRep:targetRect:]: invalid bitmap scale parameters: rect={{0, 0}, ");
     }
     const ScratchHome home;
     EXPECT_FALSE(bitmap(1, 1)->drawWithBilinearScalingIntoBitmapRep(*bitmap(32768, 1), {0, 0, 32768, 1}));
@@ -189,9 +173,7 @@ struct Fill : KXImageRep {
         : KXImageRep(size)
         , color(c) {}
     void drawInRect(QPainter& painter, const KXRect& r) const override {
-        painter.fillRect(QRectF(static_cast<qreal>(r.x), static_cast<qreal>(r.y), static_cast<qreal>(r.width),
-                                static_cast<qreal>(r.height)),
-                         color);
+        painter.fillRect(KXQtRect(r), color);
     }
 };
 
@@ -250,9 +232,7 @@ TEST(Bitmap, DrawsOnRowsAtOddAddressesAndOverHugeRectangles) {
         EXPECT_TRUE(source->drawIntoBitmapRep(*target, rect, Interpolation::high));
     const ScratchHome home;
     EXPECT_FALSE(source->drawIntoBitmapRep(*target, {0, 0, 0, 4}, Interpolation::high));
-    expectLogged("-[NSImageRep(KXAppKitAdditions) drawIntoBitmapRep:targetRect:interpolation:]: Invalid "
-                 "target for drawing "
-                 "into: rect {{0, 0}, {0, 4}}, target ");
+    expectLogged("interpolation:]: Invalid target for drawing into: rect {{0, 0}, {0, 4}}, target ");
     EXPECT_FALSE(Fill({0, 1}, Qt::white).drawIntoBitmapRep(*target, {0, 0, 4, 4}, Interpolation::high));
     EXPECT_FALSE(
         source->drawIntoBitmapRep(*Bitmap::imageRepWithPixels(4, 4, 24), {0, 0, 4, 4}, Interpolation::high));
@@ -286,10 +266,8 @@ TEST(Bitmap, GoesThroughTiffAndBack) {
         return other;
     }()));
     const ScratchHome home;
-    for (std::size_t size : {std::size_t{0}, std::size_t{7}, std::size_t{100}}) {
-        const SharedBytes whole = opaque->TIFFRepresentation();
-        EXPECT_FALSE(Bitmap::imageRepWithData(whole.slice(0, std::min(size, whole.size() - 1)))) << size;
-    }
+    for (const std::size_t size : {0U, 7U, 100U})
+        EXPECT_FALSE(Bitmap::imageRepWithData(opaque->TIFFRepresentation().slice(0, size))) << size;
 }
 
 } // namespace

@@ -21,13 +21,6 @@ int NumberOf(const Arrival& arrival) {
 
 class BackPressure : public testing::Test {
 protected:
-    int logEntries(const std::string& text) const {
-        const auto log = ScratchHome::log();
-        int count = 0;
-        for (auto at = log.find(text); at != log.npos; at = log.find(text, at + 1))
-            ++count;
-        return count;
-    }
     UnixWorld world;
 };
 
@@ -66,7 +59,7 @@ TEST_F(BackPressure, aReceiverThatHangsCostsItsSendersNothingButWhatTheyDrop) {
     const std::string rest(maximalInlinePayload, ' ');
     for (int i = 0; i < sent; ++i)
         ASSERT_EQ(Send(*remote, std::to_string(i) + rest), SendStatus::success);
-    EXPECT_EQ(logEntries("dropping messages to " + name), 1);
+    EXPECT_EQ(ScratchHome::logged("dropping messages to " + name), 1);
 
     // Another sender is not disturbed, and nothing more than its quota was taken from the first.
     const auto other = fork();
@@ -106,7 +99,7 @@ TEST_F(BackPressure, aSenderHasSoManyConnectionsAndNoMore) {
         peers.push_back(std::make_unique<RawPeer>(world.directory, name));
     for (int i = 0; i < 12; ++i)
         EXPECT_TRUE(RawPeer(world.directory, name).isCutOff());
-    EXPECT_EQ(logEntries(": too many\n"), 10) << "a minute";
+    EXPECT_EQ(ScratchHome::logged(": too many\n"), 10) << "a minute";
     for (const auto& peer : peers)
         peer->send(GoodPackets().front());
     ASSERT_TRUE(listener.waitFor(peers.size()));

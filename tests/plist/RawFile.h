@@ -2,7 +2,7 @@
 
 #include "lib/plist/Binary.h"
 
-#include <initializer_list>
+#include <gtest/gtest.h>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -11,6 +11,17 @@ namespace plist {
 
 inline Data dataOf(std::string_view bytes) {
     return Data::copyOf(bytes.data(), bytes.size());
+}
+
+/// Why the bytes are refused; empty when they are not.
+inline std::string errorOf(const Data& file, const Limits& limits = {}) {
+    std::string error;
+    const Value value = Parse(file, error, limits);
+    EXPECT_EQ(value.isNil(), !error.empty());
+    return error;
+}
+inline std::string errorOf(std::string_view text, const Limits& limits = {}) {
+    return errorOf(dataOf(text), limits);
 }
 
 inline std::string bigEndian(std::uint64_t number, std::size_t size) {

@@ -13,13 +13,6 @@ std::string listOf(const std::string& content) {
     return "<plist version=\"1.0\">" + content + "</plist>";
 }
 
-std::string errorOf(const std::string& text, const Limits& limits = {}) {
-    std::string error;
-    const Value value = Parse(dataOf(text), error, limits);
-    EXPECT_EQ(value.isNil(), !error.empty());
-    return error;
-}
-
 TEST(XML, ReadsEveryType) {
     std::string error;
     const Value value = Parse(dataOf(R"(<?xml version="1.0" encoding="UTF-8"?>

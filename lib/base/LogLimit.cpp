@@ -1,4 +1,5 @@
 #include "lib/base/LogLimit.h"
+
 #include <chrono>
 #include <cstddef>
 #include <vector>

@@ -2,6 +2,7 @@
 
 #include "lib/base/Geometry.h"
 #include "lib/kxAppKit/KXGeometry.h"
+
 #include <optional>
 
 namespace KXAffineTransform {

@@ -5,6 +5,7 @@
 #include "lib/kxAppKit/KXImageRep.h"
 #include "lib/raster/rasterops.h"
 #include "platform/FileTypeIcons.h"
+
 #include <cstddef>
 #include <cstdint>
 #include <string>

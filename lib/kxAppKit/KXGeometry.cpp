@@ -1,4 +1,5 @@
 #include "lib/kxAppKit/KXGeometry.h"
+
 #include "lib/base/Geometry.h"
 
 #include <algorithm>

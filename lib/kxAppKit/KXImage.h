@@ -68,8 +68,8 @@ public:
     /// One bitmap of exactly `size` pixels, rounded up. Margins that keeping the aspect leaves are
     /// transparent.
     Pointer imageByScalingToSize(KXSize size, bool keepAspectRatio, KXImageInterpolation interpolation) const;
-    KXRect scaledRectForFrame(const KXRect& frame) const;
-    /// `frame` counts y downwards here and below.
+    KXRect scaledRectForFrame(const KXRect& frame) const; ///< whole points; y may grow either way
+    /// `rect` counts y downwards.
     void maintainAspectRatioAndDrawInRect(QPainter& painter, const KXRect& rect) const;
     /// Its size is what keeping the aspect leaves of `size`.
     Pointer maintainAspectRatioAndScaleToSize(KXSize size) const;

@@ -1,5 +1,4 @@
 #include "lib/plist/Binary.h"
-
 #include "lib/plist/Document.h"
 #include "lib/plist/Unicode.h"
 #include "lib/plist/Value.h"

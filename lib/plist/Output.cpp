@@ -1,4 +1,5 @@
 #include "lib/plist/Output.h"
+
 #include "lib/base/SharedBytes.h"
 #include "lib/plist/Binary.h"
 #include "lib/plist/Value.h"

@@ -1,6 +1,7 @@
 #include "lib/plist/Binary.h"
 #include "lib/plist/Value.h"
 #include "lib/plist/XML.h"
+
 #include <string>
 #include <string_view>
 

@@ -5,12 +5,11 @@
 #include "lib/plist/Scalars.h"
 #include "lib/plist/Value.h"
 
-#include <cstddef>
-#include <expat.h>
-
 #include <algorithm>
 #include <array>
 #include <climits>
+#include <cstddef>
+#include <expat.h>
 #include <memory>
 #include <optional>
 #include <string>

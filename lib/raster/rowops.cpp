@@ -2,6 +2,7 @@
 
 #include "lib/raster/pixel.h"
 #include "lib/raster/rasterops.h"
+
 #include <algorithm>
 #include <cstddef>
 #include <cstdint>
@@ -110,7 +111,6 @@ void averageRows(std::uint8_t* to, const std::uint8_t* const* rows, const BoxRun
 
 } // namespace
 
-// The pixels that the span of one step from a position covers, the parts at both ends with their share.
 BoxRun boxRun(std::int64_t position, std::uint32_t step) {
     BoxRun run{position >> 16, 0, {}};
     std::uint32_t remaining = step;

@@ -60,6 +60,7 @@ struct BoxRun {
     int count;
     std::uint8_t weights[maximum];
 };
+/// The pixels that the span of one step from a position covers, the parts at both ends with their share.
 BoxRun boxRun(std::int64_t position, std::uint32_t step);
 
 struct RowOps {

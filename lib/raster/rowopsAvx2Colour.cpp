@@ -1,5 +1,6 @@
 #include "lib/raster/avx2.h"
 #include "lib/raster/rasterops.h"
+
 #include <cstddef>
 #include <cstdint>
 #include <cstring>

@@ -25,8 +25,8 @@ struct ProcessEvidence {
 };
 
 /// Tells which application a process is, by the first of: what its sandbox says it is; the desktop entry for
-/// its executable in the prefix directory; for the top process of an
-/// application's systemd unit, that unit's id; the desktop entry for its executable in the data directories.
+/// its executable in the prefix directory; for the top process of an application's systemd unit, that unit's
+/// id; the desktop entry for its executable in the data directories.
 class ApplicationIdentifier {
 public:
     /// `dataDirectories` hold "applications"; the first that has an entry wins.

@@ -91,9 +91,10 @@ std::string ProgramOfExec(std::string_view exec) {
     const auto plain = Unescaped(exec);
     std::string_view rest = plain;
     auto word = TakeWord(rest);
-    if (word == "env" || word == "/usr/bin/env") do
-            word = TakeWord(rest);
-        while (word && word->find('=') != word->npos);
+    const bool isEnv = word == "env" || word == "/usr/bin/env";
+    if (isEnv) word = TakeWord(rest);
+    while (isEnv && word && word->find('=') != word->npos)
+        word = TakeWord(rest);
     if (!word || word->starts_with('-') || RunsWhatItIsTold(*word)) return {};
     return *word;
 }

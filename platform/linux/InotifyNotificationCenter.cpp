@@ -4,6 +4,9 @@
 #include "platform/MainLoop.h"
 #include "platform/linux/PrivateDirectory.h"
 
+#include <array>
+#include <cerrno>
+#include <cstring>
 #include <fcntl.h>
 #include <functional>
 #include <memory>
@@ -11,10 +14,6 @@
 #include <string>
 #include <sys/inotify.h>
 #include <sys/stat.h>
-
-#include <array>
-#include <cerrno>
-#include <cstring>
 #include <unistd.h>
 #include <utility>
 #include <vector>

@@ -1,4 +1,5 @@
 #include "platform/linux/QtMainLoop.h"
+
 #include "platform/MainLoop.h"
 
 #include <QPointer>

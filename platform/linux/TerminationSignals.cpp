@@ -1,4 +1,5 @@
 #include "platform/linux/TerminationSignals.h"
+
 #include "platform/MainLoop.h"
 
 #include <array>

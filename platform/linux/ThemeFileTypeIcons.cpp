@@ -1,4 +1,5 @@
 #include "platform/linux/ThemeFileTypeIcons.h"
+
 #include "lib/base/SharedBytes.h"
 #include "platform/FileTypeIcons.h"
 
@@ -6,7 +7,6 @@
 #include <QImage>
 #include <QMimeDatabase>
 #include <QPixmap>
-
 #include <algorithm>
 #include <array>
 #include <cstddef>

@@ -1,4 +1,5 @@
 #include "server/catalogues/Catalogue.h"
+
 #include <functional>
 #include <vector>
 

@@ -1,4 +1,5 @@
 #include "server/catalogues/CatalogueKeeper.h"
+
 #include "server/Worker.h"
 #include "server/catalogues/Catalogue.h"
 #include "server/catalogues/Machine.h"

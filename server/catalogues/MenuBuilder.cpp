@@ -1,4 +1,5 @@
 #include "server/catalogues/MenuBuilder.h"
+
 #include "lib/plist/Value.h"
 #include "server/catalogues/Catalogue.h"
 

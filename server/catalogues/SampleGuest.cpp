@@ -2,15 +2,16 @@
 
 #include "lib/base/Log.h"
 #include "server/catalogues/Catalogue.h"
+
 #include <cstddef>
 #include <optional>
+#include <set>
 #include <string>
 #include <utility>
 #include <vector>
 
 #define TOML_EXCEPTIONS 0
 #define TOML_HEADER_ONLY 1
-#include <set>
 #include <toml++/toml.h>
 
 namespace tessel {

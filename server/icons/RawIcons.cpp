@@ -1,8 +1,8 @@
 #include "server/icons/RawIcons.h"
+
 #include "lib/plist/Value.h"
 
 #include <QImage>
-
 #include <cstddef>
 #include <cstring>
 #include <memory>

@@ -223,12 +223,7 @@ KX_AVX2 void permute(const RasterBlock& block, const std::uint8_t* from, std::pt
 }
 
 KX_AVX2 void premultiply(std::uint8_t* pixels, std::size_t count, int alphaByte) {
-    const Premultiplication premultiplied(alphaByte);
-    auto left = static_cast<std::int64_t>(count);
-#pragma GCC unroll 2
-    for (; left >= lanes; left -= lanes, pixels += vectorBytes)
-        storePixels(pixels, premultiplied(loadPixels(pixels, lanes)), lanes);
-    if (left > 0) storePixels(pixels, premultiplied(loadPixels(pixels, left)), left);
+    mapRow(pixels, count, alphaByte, Premultiplication(alphaByte));
 }
 
 KX_AVX2 void unpremultiply(std::uint8_t* pixels, std::size_t count, int alphaByte) {

@@ -8,6 +8,10 @@
 
 /// The client's end: tells the server which messages its observers want, and follows the server's coming and
 /// going. One per process. Receives nothing until `setAllowIncomingMessages(true)`.
+///
+/// Main thread only. What is posted reaches the server in the order of posting, and registrations with it;
+/// while there is no server it is not kept. Its own end does not deregister: post nothing more, and let
+/// `terminateWithDelegate` finish before.
 class KXIPCClient : public KXIPCCommon {
 public:
     explicit KXIPCClient(KXIPCContext& context);
@@ -24,6 +28,7 @@ public:
     void setAllowIncomingMessages(bool allow) override;
     void addEntries(const KXIPCObserverEntry::Array& entries, const void* observer) override;
     void removeEntries(const KXIPCObserverEntry::Array& entries, const void* observer) override;
+    /// Fails as `KX_IPC_SendMessageToNamedPort` does, which does not change whether we are connected.
     void postMessage(const KXIPCMessage& message, bool synchronously) override;
 
     /// Looks for the server and registers with it, or deregisters when incoming messages are not allowed.

@@ -15,8 +15,11 @@
 #include <vector>
 
 /// What client and server share: the local observers, the receiver, and the dispatch of what arrives.
-/// Main thread only. Observers are tokens, never dereferenced: remove an observer's entries before it goes
-/// away. Only the selector of `terminateWithDelegate` may destroy the object that calls it.
+/// Main thread only. A sender's messages are dispatched in the order of their numbers, those of different
+/// senders in order of arrival; one whose number is not above its sender's last is logged and dropped.
+/// Observers are called in the order in which they came, and their entries likewise. Observers are tokens,
+/// never dereferenced: remove an observer's entries before it goes away. Only the selector of
+/// `terminateWithDelegate` may destroy the object that calls it.
 class KXIPCCommon : public KXIPCMessageReceiverDelegate {
 public:
     explicit KXIPCCommon(KXIPCContext& context);

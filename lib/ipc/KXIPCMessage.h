@@ -8,7 +8,8 @@
 #include <string>
 #include <vector>
 
-/// One message: its name, an optional qualifier, and what it carries. Immutable.
+/// One message: its name, an optional qualifier, and what it carries. Immutable; any thread may read it. One
+/// that has arrived shares the bytes it came in, and keeps them as long as any value of it is kept.
 class KXIPCMessage {
 public:
     KXIPCMessage(std::optional<std::string> name, std::optional<std::string> object, plist::Value userInfo);

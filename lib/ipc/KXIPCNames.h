@@ -4,7 +4,9 @@
 
 #include <string>
 
-/// Constants of the protocol: the value of each is its own name.
+/// Names of the protocol. Pure functions and constants, for any thread.
+
+/// The value of each is its own name.
 inline constexpr const char KX_IPC_ADD_LISTENER_NOTIFICATION[] = "KX_IPC_ADD_LISTENER_NOTIFICATION";
 inline constexpr const char KX_IPC_REMOVE_LISTENER_NOTIFICATION[] = "KX_IPC_REMOVE_LISTENER_NOTIFICATION";
 inline constexpr const char KX_IPC_CONNECTED_TO_SERVER_NOTIFICATION[] =

@@ -14,6 +14,8 @@
 const plist::Value& KXUserInfo(const KXNotification& notification);
 
 /// One row of an observer's table: which messages, and what to call. Immutable; compared by identity alone.
+/// The selector is called on the main thread, and lives as long as the entry: until it is removed and no
+/// dispatch is under way.
 class KXIPCObserverEntry {
 public:
     using Selector = std::function<void(const KXNotification&)>;

@@ -9,6 +9,11 @@
 
 /// The server's end: knows which client wants which messages, and sends each message to those alone. One per
 /// user's session. Receives nothing until `setAllowIncomingMessages(true)`.
+///
+/// Main thread only. A client is there from its first add message until it says otherwise or its process
+/// ends; each gets its messages in the order of posting. Entries are not compared: those added twice are kept
+/// twice. A message to a client that no longer listens is logged and lost, and the client stays until its end
+/// is known.
 class KXIPCServer : public KXIPCCommon {
 public:
     explicit KXIPCServer(KXIPCContext& context);

@@ -12,16 +12,16 @@
 #include "lib/kxAppKit/system/KXWorkspace.h"
 #include "lib/plist/Value.h"
 
-#include <algorithm>
 #include <any>
 #include <cstdint>
 #include <memory>
+#include <string_view>
 #include <utility>
 #include <vector>
 
 namespace {
 
-constexpr const char* mainAppBundleIdentifiers[] = {"com.corvane.tessel", "com.corvane.tesselDaemon"};
+constexpr std::string_view mainAppBundleIdentifiers[] = {"com.corvane.tessel", "com.corvane.tesselDaemon"};
 
 SMController* theController = nullptr; // NOLINT(*-avoid-non-const-global-variables): the one that exists
 
@@ -124,9 +124,7 @@ void SMController::onMenuWindowDidResignKey(const void* window) {
 }
 
 bool SMController::isMainAppRunning() const {
-    return std::ranges::any_of(mainAppBundleIdentifiers, [this](const char* identifier) {
-        return m_services.sharedWorkspace.isAppWithBundleIdentifierRunning(identifier);
-    });
+    return m_services.sharedWorkspace.isAppWithBundleIdentifierRunning(mainAppBundleIdentifiers);
 }
 
 void SMController::performMenuItemAction(const SMMenuItem& item) {

@@ -16,6 +16,7 @@
 #include "platform/linux/FollowingStatusBar.h"
 #include "platform/linux/LinuxPorts.h"
 #include "platform/linux/LinuxSystem.h"
+#include "platform/linux/LinuxWorkspace.h"
 #include "platform/linux/NotifierStatusBar.h"
 #include "platform/linux/PlaceFindings.h"
 #include "platform/linux/PlistUserDefaults.h"
@@ -111,7 +112,8 @@ private:
     platform::ProcProcessTable m_processes{m_mainLoop, m_clock};
     KXIPCContext m_ipc{m_ports->ports(), m_ports->notifications(), m_mainLoop, m_processes, bundleIdentifier};
     std::optional<SMAgentPort> m_port;
-    KXWorkspace m_workspace{m_processes};
+    platform::LinuxWorkspace m_desktop{m_processes};
+    KXWorkspace m_workspace{m_desktop.services()};
     platform::PlistUserDefaults m_userDefaults;
     platform::QtModifierKeys m_modifierKeys;
     platform::ThemeFileTypeIcons m_fileTypeIcons;

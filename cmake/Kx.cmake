@@ -53,10 +53,10 @@ function(kx_program name)
 endfunction()
 
 # kx_test(name SOURCES … LINKS … [GUI]): one test program, run as one CTest test. With GUI it may load font and
-# theme libraries, which leave things allocated until the process ends: leaks are not looked for then. A refused
-# allocation is null under the sanitizers too.
+# theme libraries, which leave things allocated until the process ends: leaks are not looked for then. With DISPLAY
+# it runs on a private X server with a window manager and a bus. A refused allocation is null under the sanitizers too.
 function(kx_test name)
-    cmake_parse_arguments(ARG "MOC;GUI" "" "SOURCES;LINKS" ${ARGN})
+    cmake_parse_arguments(ARG "MOC;GUI;DISPLAY" "" "SOURCES;LINKS" ${ARGN})
     set(leaks 1)
     if(ARG_GUI)
         set(leaks 0)
@@ -65,7 +65,11 @@ function(kx_test name)
     target_link_libraries(${name} PRIVATE ${ARG_LINKS} kxOptions GTest::gmock_main)
     set_target_properties(${name} PROPERTIES AUTOMOC ${ARG_MOC}
         RUNTIME_OUTPUT_DIRECTORY ${CMAKE_BINARY_DIR}/tests)
-    add_test(NAME ${name} COMMAND ${name})
+    set(wrapper)
+    if(ARG_DISPLAY)
+        set(wrapper ${PROJECT_SOURCE_DIR}/tools/with-display 1280x800)
+    endif()
+    add_test(NAME ${name} COMMAND ${wrapper} $<TARGET_FILE:${name}>)
     set(environment QT_QPA_PLATFORM=offscreen KX_TEST_BIN=${CMAKE_BINARY_DIR}/bin
         ASAN_OPTIONS=detect_leaks=${leaks}:allocator_may_return_null=1 TSAN_OPTIONS=allocator_may_return_null=1)
     set_tests_properties(${name} PROPERTIES TIMEOUT 120 ENVIRONMENT "${environment}")

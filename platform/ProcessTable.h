@@ -46,6 +46,9 @@ public:
     /// Asks the process to end; false when it has ended already or may not be asked.
     virtual bool terminate(ProcessSerialNumber process) = 0;
 
+    /// Ends the process at once, whatever it is doing; false as above.
+    virtual bool kill(ProcessSerialNumber process) = 0;
+
     /// Calls `handler` once from the main loop when the process ends. Null when it has ended already or
     /// cannot be watched.
     [[nodiscard]] virtual std::unique_ptr<Handle> watchExit(ProcessSerialNumber process,

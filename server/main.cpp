@@ -2,6 +2,7 @@
 #include "lib/base/Log.h"
 #include "lib/ipc/KXIPCContext.h"
 #include "lib/ipc/KXIPCNames.h"
+#include "platform/linux/GioLaunchServices.h"
 #include "platform/linux/LinuxPorts.h"
 #include "platform/linux/PrivateDirectory.h"
 #include "platform/linux/ProcProcessTable.h"
@@ -42,10 +43,11 @@ constexpr const char* bundleIdentifier = "com.corvane.tesselDaemon";
 constexpr const char* agentName = "corvane-tesselStartMenu";
 
 /// The machines that there are without a configuration.
-std::vector<std::unique_ptr<Machine>> MakeMachines(const std::string& prefix) {
+std::vector<std::unique_ptr<Machine>> MakeMachines(const std::string& prefix,
+                                                   platform::LaunchServices& launching) {
     std::vector<std::unique_ptr<Machine>> machines;
-    machines.push_back(
-        std::make_unique<HostMachine>("host", Localized(QT_TRANSLATE_NOOP("tesselDaemon", "This computer"))));
+    machines.push_back(std::make_unique<HostMachine>(
+        "host", Localized(QT_TRANSLATE_NOOP("tesselDaemon", "This computer")), launching));
     if (auto sample = SampleMachine::open("sample", prefix + "/share/corvane-tessel/sample"))
         machines.push_back(std::move(sample));
     return machines;
@@ -87,7 +89,7 @@ public:
         RotateLogFiles();
         if (!m_options.record.empty() && !m_record.open(m_options.record))
             return fail("cannot write the record");
-        m_machines = MakeMachines(m_prefix);
+        m_machines = MakeMachines(m_prefix, m_launching);
         const auto selected = SelectedMachine(m_options, m_machines);
         if (!selected) return fail("there is no such machine");
         m_service.emplace(
@@ -120,6 +122,7 @@ private:
     std::optional<platform::LinuxPorts> m_ports{m_mainLoop};
     platform::ProcProcessTable m_processes{m_mainLoop, m_clock};
     KXIPCContext m_ipc{m_ports->ports(), m_ports->notifications(), m_mainLoop, m_processes, bundleIdentifier};
+    platform::GioLaunchServices m_launching;
     std::vector<std::unique_ptr<Machine>> m_machines;
     Worker m_worker{m_mainLoop};
     SpawnedPrograms m_programs;

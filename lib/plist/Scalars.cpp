@@ -8,8 +8,9 @@
 #include <cstddef>
 #include <cstdint>
 #include <memory>
+#include <span>
+#include <string>
 #include <string_view>
-#include <utility>
 #include <vector>
 
 namespace plist {
@@ -31,14 +32,15 @@ bool take(std::string_view& text, std::string_view prefix) {
     return true;
 }
 
+constexpr std::string_view kDigitsOf64 = "ABCDEFGHIJKLMNOPQRSTUVWXYZabcdefghijklmnopqrstuvwxyz0123456789+/";
+
 /// 0 to 63; more than that for what is no digit of base64.
 constexpr auto kDigits64 = [] {
     std::array<unsigned char, 256> digits{};
     digits.fill(0xFF);
     unsigned char next = 0;
-    for (const auto& [first, last] : {std::pair('A', 'Z'), {'a', 'z'}, {'0', '9'}, {'+', '+'}, {'/', '/'}})
-        for (char digit = first; digit <= last; ++digit)
-            digits[static_cast<unsigned char>(digit)] = next++;
+    for (const char digit : kDigitsOf64)
+        digits[static_cast<unsigned char>(digit)] = next++;
     return digits;
 }();
 
@@ -105,6 +107,21 @@ Value dataFromText(std::string_view text) {
     if (digits % 4 != 0 || padding > 2) return {};
     bytes->resize(bytes->size() - padding);
     return Data(*bytes, bytes);
+}
+
+std::string textFromData(std::span<const std::byte> data) {
+    std::string text;
+    text.reserve((data.size() + 2) / 3 * 4);
+    for (std::size_t at = 0; at < data.size(); at += 3) {
+        std::uint32_t bits = 0;
+        for (std::size_t i = at; i < at + 3; ++i)
+            bits = bits << 8 | (i < data.size() ? std::to_integer<std::uint32_t>(data[i]) : 0u);
+        for (const int shift : {18, 12, 6, 0})
+            text += kDigitsOf64[bits >> shift & 63];
+    }
+    const std::size_t padding = (3 - data.size() % 3) % 3;
+    text.replace(text.size() - padding, padding, padding, '=');
+    return text;
 }
 
 } // namespace plist

@@ -16,17 +16,25 @@ namespace platform {
 
 namespace fs = std::filesystem;
 
-fs::path PlistUserDefaults::globalDomainPath() {
+PlistUserDefaults::PlistUserDefaults(const std::string& domain) {
     const char* home = std::getenv("HOME");
-    return fs::path(home ? home : "/") / "Library/Preferences/.GlobalPreferences.plist";
+    m_path = fs::path(home ? home : "/") / "Library/Preferences" / (domain + ".plist");
 }
 
 int PlistUserDefaults::integerForKey(const std::string& key) const {
+    return values()[key].intValue();
+}
+
+bool PlistUserDefaults::holds(const std::string& key) const {
+    return !values()[key].isNil();
+}
+
+const plist::Value& PlistUserDefaults::values() const {
     if (const Stamp stamp = currentStamp(); stamp != m_stamp) {
         m_stamp = stamp;
         m_values = stamp == Stamp{} ? plist::Value() : read();
     }
-    return m_values[key].intValue();
+    return m_values;
 }
 
 PlistUserDefaults::Stamp PlistUserDefaults::currentStamp() const {

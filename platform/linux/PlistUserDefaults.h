@@ -6,7 +6,6 @@
 #include <cstdint>
 #include <filesystem>
 #include <string>
-#include <utility>
 
 namespace platform {
 
@@ -14,15 +13,14 @@ namespace platform {
 /// logged once and holds nothing until it changes. Main thread only.
 class PlistUserDefaults final : public UserDefaults {
 public:
-    /// Of the global domain: ~/Library/Preferences/.GlobalPreferences.plist.
-    static std::filesystem::path globalDomainPath();
-
-    explicit PlistUserDefaults(std::filesystem::path path = globalDomainPath())
-        : m_path(std::move(path)) {}
+    /// Of the domain: ~/Library/Preferences/<domain>.plist.
+    explicit PlistUserDefaults(const std::string& domain = ".GlobalPreferences");
 
     int integerForKey(const std::string& key) const override;
+    bool holds(const std::string& key) const;
 
 private:
+    const plist::Value& values() const;
     /// Of the file as it was read; all zero while there is none.
     struct Stamp {
         std::filesystem::file_time_type modified;

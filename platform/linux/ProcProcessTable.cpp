@@ -150,8 +150,17 @@ const ProcessEvidence& ProcProcessTable::evidenceOf(int pid, const ProcStat& sta
 }
 
 bool ProcProcessTable::terminate(ProcessSerialNumber process) {
+    return send(process, SIGTERM);
+}
+
+bool ProcProcessTable::kill(ProcessSerialNumber process) {
+    return send(process, SIGKILL);
+}
+
+/// Through a descriptor, so that the signal never reaches another process with the same id.
+bool ProcProcessTable::send(ProcessSerialNumber process, int signal) const {
     const auto opened = open(process);
-    return opened && syscall(SYS_pidfd_send_signal, opened.get(), SIGTERM, nullptr, 0) == 0;
+    return opened && syscall(SYS_pidfd_send_signal, opened.get(), signal, nullptr, 0) == 0;
 }
 
 std::unique_ptr<Handle> ProcProcessTable::watchExit(ProcessSerialNumber process,

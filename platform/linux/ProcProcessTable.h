@@ -33,6 +33,7 @@ public:
     std::optional<ProcessInfo> nextProcess(ProcessSerialNumber after) const override;
     std::optional<ProcessInfo> info(ProcessSerialNumber process) const override;
     bool terminate(ProcessSerialNumber process) override;
+    bool kill(ProcessSerialNumber process) override;
     [[nodiscard]] std::unique_ptr<Handle> watchExit(ProcessSerialNumber process,
                                                     std::function<void()> handler) override;
 
@@ -44,6 +45,7 @@ private:
     };
 
     Descriptor open(ProcessSerialNumber process) const;
+    bool send(ProcessSerialNumber process, int signal) const;
     void startWalk() const;
     ProcessInfo infoOf(int pid, const ProcStat& stat) const;
     const ProcessEvidence& evidenceOf(int pid, const ProcStat& stat) const;

@@ -1,9 +1,9 @@
 #include "server/linux/HostCatalogue.h"
 
+#include "platform/linux/GObjectPointer.h"
 #include "server/Texts.h"
 #include "server/catalogues/Catalogue.h"
 #include "server/catalogues/Categories.h"
-#include "server/linux/GObjectPointer.h"
 
 #include <cstddef>
 #include <gio/gdesktopappinfo.h>
@@ -24,6 +24,11 @@
 
 namespace tessel {
 namespace {
+
+using platform::GFree;
+using platform::GObjectPointer;
+using platform::StringOr;
+using platform::TakeString;
 
 constexpr const char* genericIcon = "application-x-executable";
 constexpr std::size_t frequentCount = 8;

@@ -1,7 +1,7 @@
 #include "server/linux/HostIconTheme.h"
 
+#include "platform/linux/GObjectPointer.h"
 #include "server/icons/ThemeIcons.h"
-#include "server/linux/GObjectPointer.h"
 
 #include <algorithm>
 #include <filesystem>
@@ -14,6 +14,10 @@
 
 namespace tessel {
 namespace {
+
+using platform::GObjectPointer;
+using platform::StringOr;
+using platform::TakeString;
 
 struct KeyFileFree {
     void operator()(GKeyFile* file) const { g_key_file_free(file); }

@@ -1,10 +1,12 @@
 #include "server/linux/HostMachine.h"
 
 #include "lib/plist/Value.h"
+#include "platform/LaunchServices.h"
 #include "platform/MainLoop.h"
+#include "platform/Status.h"
+#include "platform/linux/GObjectPointer.h"
 #include "server/catalogues/Catalogue.h"
 #include "server/catalogues/Machine.h"
-#include "server/linux/GObjectPointer.h"
 #include "server/linux/HostCatalogue.h"
 #include "server/linux/HostIconTheme.h"
 
@@ -20,28 +22,8 @@
 namespace tessel {
 namespace {
 
-using Handler = Machine::LaunchHandler;
-
-void Finish(gpointer handler, bool succeeded, GError* error) {
-    const std::unique_ptr<Handler> done(static_cast<Handler*>(handler));
-    const GErrorPointer owned(error);
-    if (succeeded)
-        (*done)(std::nullopt);
-    else
-        (*done)(error ? error->message : "unknown reason");
-}
-
-void OnEntryLaunched(GObject* entry, GAsyncResult* result, gpointer handler) {
-    GError* error = nullptr;
-    const bool succeeded = g_app_info_launch_uris_finish(G_APP_INFO(entry), result, &error);
-    Finish(handler, succeeded, error);
-}
-
-void OnPlaceOpened(GObject*, GAsyncResult* result, gpointer handler) {
-    GError* error = nullptr;
-    const bool succeeded = g_app_info_launch_default_for_uri_finish(result, &error);
-    Finish(handler, succeeded, error);
-}
+using platform::GObjectPointer;
+using platform::StringOr;
 
 class Monitor final : public platform::Handle {
 public:
@@ -73,18 +55,20 @@ plist::Value HostMachine::readIcon(const std::string& icon) {
 }
 
 void HostMachine::launch(const CatalogueItem& item, LaunchHandler done) {
-    const GObjectPointer<GAppLaunchContext> context(g_app_launch_context_new());
-    auto handler = std::make_unique<Handler>(std::move(done));
+    platform::LaunchRequest request;
+    request.flags = platform::launchAsync;
     if (item.id.starts_with(placePrefix)) {
-        const std::string uri = item.id.substr(placePrefix.size());
-        g_app_info_launch_default_for_uri_async(uri.c_str(), context.get(), nullptr, OnPlaceOpened,
-                                                handler.release());
-        return;
+        request.documentURLs = {item.id.substr(placePrefix.size())};
+    } else {
+        const GObjectPointer<GDesktopAppInfo> entry(g_desktop_app_info_new(item.id.c_str()));
+        if (!entry) return done("its desktop entry is gone");
+        request.applicationPath = StringOr(g_desktop_app_info_get_filename(entry.get()));
     }
-    const GObjectPointer<GDesktopAppInfo> entry(g_desktop_app_info_new(item.id.c_str()));
-    if (!entry) return (*handler)("its desktop entry is gone");
-    g_app_info_launch_uris_async(G_APP_INFO(entry.get()), nullptr, context.get(), nullptr, OnEntryLaunched,
-                                 handler.release());
+    const std::weak_ptr<const bool> life = m_life;
+    m_launching.open(request, [life, done = std::move(done)](const platform::LaunchOutcome& outcome) {
+        if (life.expired()) return;
+        done(outcome.status == platform::status::success ? std::nullopt : std::optional(outcome.reason));
+    });
 }
 
 std::unique_ptr<platform::Handle> HostMachine::watch(std::function<void()> changed) {

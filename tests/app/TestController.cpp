@@ -3,6 +3,7 @@
 #include "lib/base/KXNotificationCenter.h"
 #include "lib/kxAppKit/system/KXWorkspace.h"
 #include "tests/app/AgentClient.h"
+#include "tests/support/InMemoryDesktop.h"
 
 #include <gmock/gmock.h>
 
@@ -81,7 +82,8 @@ protected:
 
     Record record;
     AgentWire wire;
-    KXWorkspace workspace{wire.processes};
+    InMemoryDesktop desktop;
+    KXWorkspace workspace{desktop.services(wire.processes)};
     FakeStatusBar bar{record};
     AgentClient* client = nullptr;
     FakeMenuWindow* window = nullptr;
@@ -123,7 +125,9 @@ TEST_F(Controller, StartsAndEndsInOrder) {
 
 TEST_F(Controller, OpensUnderTheItemAndClosesOnTheNextClick) {
     launch();
+    wire.processes.walks = 0;
     bar.shown->mouseDown();
+    EXPECT_EQ(wire.processes.walks, 1) << "a click must stay cheap";
     EXPECT_THAT(happened(), ElementsAre("create", "setFrame", "show", "post menu.refresh"));
     EXPECT_EQ(window->frame(), (KXRect{725, 478, 300, 400}));
     EXPECT_TRUE(bar.shown->isSelected());

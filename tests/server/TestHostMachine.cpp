@@ -1,14 +1,15 @@
 #include "server/linux/HostMachine.h"
 
+#include "platform/linux/GioLaunchServices.h"
 #include "server/linux/HostCatalogue.h"
 #include "server/linux/SpawnedPrograms.h"
+#include "tests/support/ScratchComputer.h"
 
 #include <QGuiApplication>
 #include <QImage>
 
 #include <gio/gio.h>
 #include <gmock/gmock.h>
-#include <sys/stat.h>
 
 #include <cstdlib>
 #include <filesystem>
@@ -22,41 +23,7 @@ namespace {
 
 namespace fs = std::filesystem;
 
-/// A computer of its own: GLib reads where things lie once, so it stands before all else.
-struct Computer {
-    Computer() {
-        std::string path = fs::temp_directory_path() / "kx-host-XXXXXX";
-        root = mkdtemp(path.data());
-        const std::pair<const char*, std::string> variables[] = {
-            {"HOME", root},
-            {"XDG_DATA_HOME", root / "data"},
-            {"XDG_DATA_DIRS", root / "system"},
-            {"XDG_CONFIG_HOME", root / "config"},
-            {"LANGUAGE", "de"},
-            {"LC_ALL", "C.UTF-8"},
-            {"XDG_CURRENT_DESKTOP", "KXTest"},
-            {"DBUS_SESSION_BUS_ADDRESS", "disabled:"},
-        };
-        for (const auto& [name, value] : variables)
-            setenv(name, value.c_str(), 1);
-        fs::create_directories(root / "data/applications");
-        fs::create_directories(root / "Dokumente");
-        write("config/user-dirs.dirs",
-              "XDG_DOCUMENTS_DIR=\"$HOME/Dokumente\"\nXDG_MUSIC_DIR=\"$HOME/gone\"\n");
-    }
-    ~Computer() { fs::remove_all(root); }
-
-    void write(const fs::path& path, const std::string& text) const {
-        fs::create_directories((root / path).parent_path());
-        std::ofstream(root / path) << text;
-    }
-    void install(const std::string& id, const std::string& keys) const {
-        const std::string head = "[Desktop Entry]\nType=Application\nExec=/bin/true\nName=" + id + "\n";
-        write("data/applications/" + id + ".desktop", head + keys);
-    }
-
-    fs::path root;
-} const computer;
+platform::GioLaunchServices launching;
 
 void runUntil(const std::function<bool()>& condition) {
     while (!condition())
@@ -111,7 +78,7 @@ TEST(HostMachine, ReadsIconsOfTheThemeOnAThreadOfItsOwn) {
     green.fill(QColor(0, 255, 0, 128));
     green.save(QString::fromStdString(computer.root / "loose.png"));
     std::async(std::launch::async, [&] {
-        HostMachine machine("host", "This");
+        HostMachine machine("host", "This", launching);
         machine.readCatalogue();
         EXPECT_EQ(machine.readIcon("kx-svg").size(), 4u);
         const plist::Value set = machine.readIcon(computer.root / "loose.png");
@@ -125,13 +92,8 @@ TEST(HostMachine, ReadsIconsOfTheThemeOnAThreadOfItsOwn) {
 }
 
 TEST(HostMachine, LaunchesThroughTheDesktopEntryAndSaysWhyNot) {
-    HostMachine machine("host", "This");
-    const fs::path fifo = computer.root / "fifo";
-    ASSERT_EQ(mkfifo(fifo.c_str(), 0600), 0);
-    computer.write("script", "#!/bin/sh\necho \"$1 $GIO_LAUNCHED_DESKTOP_FILE\" > " + fifo.string() + "\n");
-    fs::permissions(computer.root / "script", fs::perms::owner_all);
-    const std::string script = (computer.root / "script").string();
-    computer.install("kx-script", "NoDisplay=true\nExec=" + script + " \"two words\" %U\n");
+    HostMachine machine("host", "This", launching);
+    computer.install("kx-true", "NoDisplay=true\n");
     computer.install("kx-broken", "NoDisplay=true\nExec=/no/such/program\n");
     const auto launch = [&](const std::string& id) {
         std::optional<std::string> result;
@@ -142,19 +104,16 @@ TEST(HostMachine, LaunchesThroughTheDesktopEntryAndSaysWhyNot) {
     // The library learns of a new entry from a thread that watches the folder.
     std::string outcome;
     do
-        outcome = launch("kx-script.desktop");
+        outcome = launch("kx-true.desktop");
     while (outcome == "its desktop entry is gone");
-    ASSERT_EQ(outcome, "started");
-    std::string line;
-    std::getline(std::ifstream(fifo), line);
-    EXPECT_EQ(line, "two words " + (computer.root / "data/applications/kx-script.desktop").string());
+    EXPECT_EQ(outcome, "started");
     EXPECT_EQ(launch("kx-gone.desktop"), "its desktop entry is gone");
     EXPECT_NE(launch("kx-broken.desktop"), "started");
     EXPECT_NE(launch("place:kx-unknown://x"), "started");
 }
 
 TEST(HostMachine, TellsWhenAnEntryComes) {
-    HostMachine machine("host", "This");
+    HostMachine machine("host", "This", launching);
     bool isChanged = false;
     const auto watch = machine.watch([&] { isChanged = true; });
     machine.readCatalogue();

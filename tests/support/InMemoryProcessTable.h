@@ -51,6 +51,7 @@ public:
     }
 
     std::optional<platform::ProcessInfo> nextProcess(platform::ProcessSerialNumber after) const override {
+        walks += after == platform::ProcessSerialNumber{};
         const auto found = m_processes.upper_bound(after.lowLongOfPSN);
         return found == m_processes.end() ? std::nullopt : std::optional(found->second);
     }
@@ -60,11 +61,14 @@ public:
         return m_processes.at(process.lowLongOfPSN);
     }
 
+    mutable int walks = 0; ///< that were begun
+
     bool terminate(platform::ProcessSerialNumber process) override {
         if (!info(process)) return false;
         end(process);
         return true;
     }
+    bool kill(platform::ProcessSerialNumber process) override { return terminate(process); }
 
     std::unique_ptr<platform::Handle> watchExit(platform::ProcessSerialNumber process,
                                                 std::function<void()> handler) override {

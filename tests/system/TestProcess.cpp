@@ -1,5 +1,6 @@
 #include "lib/kxAppKit/system/KXProcess.h"
 #include "lib/kxAppKit/system/KXWorkspace.h"
+#include "tests/support/InMemoryDesktop.h"
 #include "tests/support/InMemoryProcessTable.h"
 #include "tests/support/ScratchHome.h"
 
@@ -106,9 +107,11 @@ TEST(Process, AreFoundExactlyAndInAscendingOrder) {
     const std::string url = "file:///usr/share/applications/com.example.guest.desktop";
     EXPECT_EQ(KXProcess::processWithBundleIdentifier(table, "com.example.guest")->pid(), 2000);
     EXPECT_EQ(KXProcess::processWithURL(table, url)->pid(), 2000);
-    EXPECT_TRUE(KXWorkspace(table).isAppWithBundleIdentifierRunning("com.example.guest"));
-    EXPECT_FALSE(KXWorkspace(table).isAppWithBundleIdentifierRunning("com.example.Guest"));
-    EXPECT_FALSE(KXWorkspace(table).isAppWithBundleIdentifierRunning(""));
+    InMemoryDesktop desktop;
+    const KXWorkspace workspace(desktop.services(table));
+    EXPECT_TRUE(workspace.isAppWithBundleIdentifierRunning("com.example.guest"));
+    EXPECT_FALSE(workspace.isAppWithBundleIdentifierRunning("com.example.Guest"));
+    EXPECT_FALSE(workspace.isAppWithBundleIdentifierRunning(""));
 
     const auto current = KXProcess::currentProcess(table);
     EXPECT_EQ(current->pid(), 1000);

@@ -1,10 +1,11 @@
 #include "lib/kxAppKit/system/KXProcess.h"
 
 #include "lib/base/Log.h"
+#include "lib/kxAppKit/system/KXFileURL.h"
 #include "lib/plist/Value.h"
 #include "platform/ProcessTable.h"
+#include "platform/Workspace.h"
 
-#include <cctype>
 #include <cstdint>
 #include <memory>
 #include <optional>
@@ -21,20 +22,6 @@ KXProcess::Pointer FirstProcess(platform::ProcessTable& table, const Predicate& 
     while (auto process = processes.nextObject())
         if (matches(*process)) return process;
     return nullptr;
-}
-
-std::string FileURLOfPath(const std::string& path) {
-    constexpr std::string_view digits = "0123456789ABCDEF";
-    constexpr std::string_view kept = "/-._~!$&'()*+,=:@";
-    std::string url = "file://";
-    for (const char character : path) {
-        const auto byte = static_cast<unsigned char>(character);
-        if ((byte < 0x80 && std::isalnum(byte) != 0) || kept.find(character) != kept.npos)
-            url += character;
-        else
-            url.append({'%', digits[byte >> 4], digits[byte & 15]});
-    }
-    return url;
 }
 
 } // namespace
@@ -63,7 +50,7 @@ KXProcess::Pointer KXProcess::processWithSerialNumber(platform::ProcessTable& ta
 }
 
 KXProcess::Pointer KXProcess::processWithBundleIdentifier(platform::ProcessTable& table,
-                                                          const std::string& bundleID) {
+                                                          std::string_view bundleID) {
     return FirstProcess(table,
                         [&](const KXProcess& process) { return process.bundleIdentifier() == bundleID; });
 }
@@ -79,6 +66,12 @@ KXProcess::Pointer KXProcess::currentProcess(platform::ProcessTable& table) {
     if (!cached || &cached->m_table != &table || cached->m_psn != *current)
         cached = processWithSerialNumber(table, *current);
     return cached;
+}
+
+KXProcess::Pointer KXProcess::activeProcess(platform::ProcessTable& table,
+                                            const platform::Workspace& workspace) {
+    const auto front = table.serialNumberOf(workspace.frontProcessID());
+    return front ? processWithSerialNumber(table, *front) : nullptr;
 }
 
 KXProcessEnumerator KXProcess::processEnumerator(platform::ProcessTable& table) {
@@ -98,7 +91,8 @@ plist::Value KXProcess::info() const {
                                  {"LSBackgroundOnly", info->isBackgroundOnly}};
     if (!info->executablePath.empty()) dictionary.set("CFBundleExecutable", info->executablePath);
     if (info->bundleIdentifier) dictionary.set("CFBundleIdentifier", *info->bundleIdentifier);
-    if (info->bundlePath) dictionary.set("BundlePath", *info->bundlePath);
+    const auto& path = info->bundlePath ? *info->bundlePath : info->executablePath;
+    if (!path.empty()) dictionary.set("BundlePath", path);
     return dictionary;
 }
 
@@ -108,7 +102,7 @@ bool KXProcess::isValid() const {
 
 std::optional<std::string> KXProcess::url() const {
     const auto path = info()["BundlePath"].string();
-    return path ? std::optional(FileURLOfPath(*path)) : std::nullopt;
+    return path ? KXFileURLOfPath(*path) : std::nullopt;
 }
 
 bool KXProcess::hasUI() const {
@@ -120,8 +114,28 @@ bool KXProcess::isEqual(const KXProcess* other) const {
     return other != nullptr && other->m_psn == m_psn;
 }
 
+bool KXProcess::isActiveApplication(const platform::Workspace& workspace) const {
+    return isEqual(activeProcess(m_table, workspace).get());
+}
+
+void KXProcess::activate(const platform::Workspace& workspace) const {
+    bringToFront(workspace, platform::ProcessWindows::all, "-[KXProcess activate]");
+}
+
+void KXProcess::activateForFrontWindow(const platform::Workspace& workspace) const {
+    bringToFront(workspace, platform::ProcessWindows::frontOne, "-[KXProcess activateForFrontWindow]");
+}
+
+void KXProcess::bringToFront(const platform::Workspace& workspace, platform::ProcessWindows windows,
+                             const char* method) const {
+    const int process = pid();
+    const platform::Status error =
+        process == 0 ? platform::status::processNotFound : workspace.bringToFront(process, windows);
+    if (error != platform::status::success) Log("%s, Error: %d\n", method, error);
+}
+
 bool KXProcess::kill() {
-    return m_table.terminate(m_psn);
+    return m_table.kill(m_psn);
 }
 
 bool KXProcess::registerForProcessDeathNotification() {

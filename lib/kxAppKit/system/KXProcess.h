@@ -2,12 +2,14 @@
 
 #include "lib/plist/Value.h"
 #include "platform/ProcessTable.h"
+#include "platform/Workspace.h"
 
 #include <cstdint>
 #include <functional>
 #include <memory>
 #include <optional>
 #include <string>
+#include <string_view>
 #include <vector>
 
 using ProcessSerialNumber = platform::ProcessSerialNumber;
@@ -25,25 +27,32 @@ public:
 
     static Pointer processWithSerialNumber(platform::ProcessTable& table, ProcessSerialNumber process);
     /// The first by process id, or null.
-    static Pointer processWithBundleIdentifier(platform::ProcessTable& table, const std::string& bundleID);
+    static Pointer processWithBundleIdentifier(platform::ProcessTable& table, std::string_view bundleID);
     /// The first whose `url` is that, or null.
     static Pointer processWithURL(platform::ProcessTable& table, const std::string& url);
     /// This process, made anew only when it has changed; null when it cannot be read.
     static Pointer currentProcess(platform::ProcessTable& table);
+    /// The one whose window has the keyboard, or null.
+    static Pointer activeProcess(platform::ProcessTable& table, const platform::Workspace& workspace);
     static KXProcessEnumerator processEnumerator(platform::ProcessTable& table);
 
     ProcessSerialNumber processSerialNumber() const { return m_psn; }
     /// As it was when the handle was made.
     const std::optional<std::string>& bundleIdentifier() const { return m_bundleID; }
     int pid() const; ///< 0 once it has ended
-    /// What is known of it: "pid", "CFBundleExecutable", "CFBundleIdentifier", "BundlePath", "LSUIElement",
-    /// "LSBackgroundOnly". Nil once it has ended.
+    /// What is known of it: "pid", "CFBundleExecutable", "CFBundleIdentifier", "BundlePath" (the desktop
+    /// entry, or without one the executable), "LSUIElement", "LSBackgroundOnly". Nil once it has ended.
     plist::Value info() const;
     bool isValid() const;
-    std::optional<std::string> url() const; ///< of its bundle
+    std::optional<std::string> url() const; ///< of its "BundlePath"
     bool hasUI() const;
     bool isEqual(const KXProcess* other) const;
-    bool kill(); ///< asks it to end; false when it cannot be asked
+    bool isActiveApplication(const platform::Workspace& workspace) const;
+    /// Brings all its windows forward, and gives the keyboard to the front one. Logs when that cannot be.
+    void activate(const platform::Workspace& workspace) const;
+    /// Only the front one.
+    void activateForFrontWindow(const platform::Workspace& workspace) const;
+    bool kill(); ///< at once, without asking it; false when it has ended already or is not ours to end
 
     using DeathHandler = std::function<void(KXProcess&)>;
     /// Calls `handler` once when the process ends, in the order of adding; ignored and logged when it has
@@ -66,6 +75,8 @@ private:
         bool removed = false;
     };
 
+    void bringToFront(const platform::Workspace& workspace, platform::ProcessWindows windows,
+                      const char* method) const;
     bool registerForProcessDeathNotification();
     void onProcessDeath();
 

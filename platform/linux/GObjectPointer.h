@@ -5,7 +5,7 @@
 #include <memory>
 #include <string>
 
-namespace tessel {
+namespace platform {
 
 struct GObjectUnref {
     void operator()(void* object) const { g_object_unref(object); }
@@ -17,6 +17,10 @@ struct GErrorFree {
     void operator()(GError* error) const { g_error_free(error); }
 };
 using GErrorPointer = std::unique_ptr<GError, GErrorFree>;
+
+struct GVariantUnref {
+    void operator()(GVariant* variant) const { g_variant_unref(variant); }
+};
 
 struct GFree {
     void operator()(void* memory) const { g_free(memory); }
@@ -32,4 +36,4 @@ inline std::string StringOr(const char* text, const char* fallback = "") {
     return text ? text : fallback;
 }
 
-} // namespace tessel
+} // namespace platform

@@ -1,0 +1,27 @@
+#pragma once
+
+#include <array>
+#include <cstdint>
+#include <cstdlib>
+#include <memory>
+#include <xcb/xcb.h>
+
+/// The calls to an X server that several files need.
+namespace platform {
+
+struct XcbFreed {
+    void operator()(void* memory) const {
+        std::free(memory);
+    } // NOLINT(*-no-malloc): xcb's replies ask for it
+};
+template <typename T>
+using XcbReply = std::unique_ptr<T, XcbFreed>;
+
+xcb_window_t XcbRootWindow(xcb_connection_t* connection);
+/// Kept for the life of the process: connections must be to one server.
+xcb_atom_t XcbAtom(xcb_connection_t* connection, const char* name);
+/// Sends what a window manager listens for, about `window`.
+void XcbSendToRoot(xcb_connection_t* connection, xcb_window_t window, const char* type,
+                   const std::array<std::uint32_t, 5>& data);
+
+} // namespace platform

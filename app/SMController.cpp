@@ -42,7 +42,10 @@ SMController* SMController::sharedController() {
 }
 
 SMController::SMController(SMServices services)
-    : m_services(std::move(services)) {
+    : m_services(std::move(services))
+    , m_fontWarmer({.mainLoop = m_services.mainLoop,
+                    .isMenuHidden = [this] { return !isMenuWindowVisible(); },
+                    .shape = m_services.prepareFonts}) {
     theController = this;
 }
 
@@ -117,6 +120,7 @@ void SMController::closeMenuWindow() {
     if (m_statusItemView) m_statusItemView->setIsSelected(false);
     // Also when it is hidden already: every call stamps the time of hiding.
     if (m_menuWindow) m_menuWindow->hideMenuWindow();
+    m_fontWarmer.resume();
 }
 
 void SMController::onMenuWindowDidResignKey(const void* window) {
@@ -155,6 +159,7 @@ void SMController::onStartMenuUpdate(const plist::Value& menu, std::vector<std::
     const auto allPrograms = itemsForArray(menu["allPrograms"]);
     m_model.allProgramsMenu = allPrograms ? SMMenuItem::initWithSubmenu(*allPrograms) : nullptr;
     if (m_menuWindow) m_menuWindow->reloadData();
+    m_fontWarmer.take(m_model);
 }
 
 void SMController::onStartMenuShow() {

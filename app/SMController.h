@@ -4,6 +4,7 @@
 #include "app/SMMenuWindow.h"
 #include "app/SMMenuWindowOwner.h"
 #include "app/SMStatusItemView.h"
+#include "app/menuFontWarmer.h"
 #include "platform/MainLoop.h"
 #include "platform/StatusBar.h"
 
@@ -23,6 +24,9 @@ struct SMServices {
     std::function<std::unique_ptr<platform::Handle>()> holdTyping;
     /// Runs `applicationWillTerminate` and ends the process inside the call.
     std::function<void()> terminate;
+    platform::MainLoop& mainLoop;
+    /// Makes the fonts ready that the menu would show the text in.
+    std::function<void(const std::string& text)> prepareFonts;
 };
 
 /// The application's delegate: owns the status item, the proxy, the menu window and the menu's contents, and
@@ -76,4 +80,5 @@ private:
     std::unique_ptr<platform::StatusItem> m_statusItem;
     std::unique_ptr<SMMenuProxy> m_menuProxy;
     std::unique_ptr<SMMenuWindow> m_menuWindow; ///< null until the menu first opens
+    MenuFontWarmer m_fontWarmer;
 };

@@ -140,8 +140,7 @@ MenuListState SMMenuCollectionView::layoutState() const {
     return state;
 }
 
-void SMMenuCollectionView::performLayout() {
-    m_needsLayout = false;
+void SMMenuCollectionView::makeButtons() {
     if (m_needsButtons) {
         m_needsButtons = false;
         m_menuButtons.reserve(m_menuItems.size() + 3);
@@ -151,6 +150,11 @@ void SMMenuCollectionView::performLayout() {
         if (count > 0 && m_scrollIndex >= count) m_scrollIndex = count - 1;
     }
     takeOutExtraButtons();
+}
+
+void SMMenuCollectionView::performLayout() {
+    m_needsLayout = false;
+    makeButtons();
     m_scrollIndex = std::min(m_scrollIndex, m_menuButtons.size());
     const MenuListLayout layout = layoutMenuList(rows(), layoutState());
     insertExtraButton(m_topSeparatorButton, layout.topSeparator);
@@ -173,10 +177,14 @@ void SMMenuCollectionView::placeButtons(const std::vector<MenuRowPlace>& places)
     }
 }
 
+std::vector<SMMenuButton::Pointer>::const_iterator
+SMMenuCollectionView::findRow(const SMMenuItem* item) const {
+    if (!item) return m_menuButtons.end();
+    return std::ranges::find_if(m_menuButtons, [item](const auto& b) { return b->menuItem().get() == item; });
+}
+
 SMMenuButton::Pointer SMMenuCollectionView::findButtonForMenuItem(const SMMenuItem* item) const {
-    if (!item) return nullptr;
-    const auto found =
-        std::ranges::find_if(m_menuButtons, [item](const auto& b) { return b->menuItem().get() == item; });
+    const auto found = findRow(item);
     return found == m_menuButtons.end() ? nullptr : *found;
 }
 
@@ -200,21 +208,22 @@ bool SMMenuCollectionView::scrollUp() {
 
 bool SMMenuCollectionView::scrollDown() {
     if (m_disallowScrolling || !m_scrollDownMenuButton || !m_scrollDownMenuButton->superview()) return false;
+    const std::size_t before = m_scrollIndex;
     m_scrollIndex += m_scrollUpMenuButton->superview() ? 1 : 2;
     performLayout();
-    return true;
+    return m_scrollIndex > before; // a list too low even for its arrows shows one at the end, too
 }
 
 SMMenuButton::Pointer SMMenuCollectionView::scrollItemToVisible(const SMMenuItem* item) {
+    makeButtons();
+    const auto found = findRow(item);
+    // Where the steps would lead, laid out once: a layout for every step would be quadratic.
+    if (found != m_menuButtons.end())
+        m_scrollIndex = scrollIndexShowing(rows(), layoutState(),
+                                           static_cast<std::size_t>(found - m_menuButtons.begin()));
+    const auto button = found == m_menuButtons.end() ? nullptr : *found;
     performLayout();
-    const auto button = findButtonForMenuItem(item);
-    if (!button || !button->isHidden()) return button;
-    // The step that is looked for first, laid out once: a layout for every step would be quadratic.
-    takeOutExtraButtons();
-    const auto target = std::ranges::find(m_menuButtons, button) - m_menuButtons.begin();
-    m_scrollIndex = scrollIndexShowing(rows(), layoutState(), static_cast<std::size_t>(target));
-    performLayout();
-    return button->isHidden() ? nullptr : button;
+    return button && !button->isHidden() ? button : nullptr;
 }
 
 void SMMenuCollectionView::onScrollButton(SMMenuButton& sender) {

@@ -87,7 +87,7 @@ public:
     /// False when the list does not scroll further that way.
     bool scrollUp();
     bool scrollDown();
-    /// The item's row if it can be brought into view, else null.
+    /// The item's row if it can be brought into view, else null. Lays out once, however far it is.
     SMMenuButton::Pointer scrollItemToVisible(const SMMenuItem* item);
 
     std::optional<platform::Clock::Instant> delayedScrollTimerFireDate() const { return m_delayedFireDate; }
@@ -116,7 +116,10 @@ private:
     void resetAll();
     void addMenuButtons(const SMMenuItems& items, std::int32_t indentation);
     SMMenuButton::Pointer makeButton(std::int32_t style);
+    /// Makes the rows anew if they must be; the extra ones are out afterwards.
+    void makeButtons();
     void takeOutExtraButtons();
+    std::vector<SMMenuButton::Pointer>::const_iterator findRow(const SMMenuItem* item) const;
     void insertExtraButton(const SMMenuButton::Pointer& button, std::optional<std::size_t> index);
     std::vector<MenuListRow> rows() const;
     MenuListState layoutState() const;

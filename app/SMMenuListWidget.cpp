@@ -35,7 +35,7 @@ void SMMenuListWidget::fitList() {
     if (m_list && m_list->size() != wanted) m_list->setSize(wanted);
 }
 
-QPixmap SMMenuListWidget::picture() const {
+QPixmap SMMenuListWidget::picture() {
     const double ratio = devicePixelRatioF();
     QPixmap picture((QSizeF(size()) * ratio).toSize());
     picture.setDevicePixelRatio(ratio);
@@ -77,12 +77,13 @@ void SMMenuListWidget::paintEvent(QPaintEvent* event) {
     }
 }
 
-void SMMenuListWidget::drawRows(QPainter& painter, const QRectF& dirty) const {
+void SMMenuListWidget::drawRows(QPainter& painter, const QRectF& dirty) {
     if (!m_list) return;
     m_list->forEachVisibleButton([&](const SMMenuButton& button) {
         const QRectF place = fromUpwards(button.frame());
         if (!place.intersects(dirty)) return;
         painter.translate(place.topLeft()); // and back: saving the painter's state would allocate
+        ++m_paintedRows;
         button.draw(painter, button.frame().size(), tools());
         painter.translate(-place.topLeft());
     });

@@ -4,6 +4,7 @@
 #include "app/SMMenuHostWidget.h"
 
 #include <QPixmap>
+#include <cstddef>
 
 /// Shows a list; paints its visible rows.
 class SMMenuListWidget final : public SMMenuHostWidget, private SMMenuCollectionView::Host {
@@ -19,6 +20,8 @@ public:
     SMMenuCollectionView* list() const { return m_list; }
     /// In the widget.
     QRectF placeOf(const SMMenuButton& row) const { return fromUpwards(row.frame()); }
+    /// Rows painted since the beginning, for those who count.
+    std::size_t paintedRows() const { return m_paintedRows; }
     /// Slides from the list shown to another, which comes in from where text ends when `forward`. Returns
     /// when it is there; no event is handled meanwhile.
     void slideTo(SMMenuCollectionView* list, bool forward, const platform::Clock& clock);
@@ -35,9 +38,10 @@ private:
         double beforeX;
         double afterX;
     };
-    QPixmap picture() const;
-    void drawRows(QPainter& painter, const QRectF& dirty) const;
+    QPixmap picture();
+    void drawRows(QPainter& painter, const QRectF& dirty);
 
     SMMenuCollectionView* m_list = nullptr;
     const Slide* m_slide = nullptr; ///< while one is under way
+    std::size_t m_paintedRows = 0;
 };

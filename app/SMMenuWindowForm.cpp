@@ -63,7 +63,7 @@ public:
     bool isVisible() const override { return m_window->isVisible(); }
     KXRect frame() const override { return m_window->frame(); }
     void setFrame(const KXRect& frame) override;
-    KXRect visibleScreenFrame() const override { return m_windowServer.visibleFrame(); }
+    KXRect visibleScreenFrame() const override { return m_windowServer.visibleFrame(m_statusItemFrame()); }
     void makeKeyAndOrderFront() override;
     void orderOut() override { m_window->orderOut(); }
     void setNeedsDisplay() override { m_view.update(); }
@@ -87,6 +87,7 @@ private:
 
     platform::WindowServer& m_windowServer;
     const platform::Clock& m_clock;
+    std::function<KXRect()> m_statusItemFrame;
     MenuPainter m_painter;
     SMThemeView m_view;
     Ui::menuWindow m_ui;
@@ -98,12 +99,12 @@ private:
 MenuWindowForm::MenuWindowForm(const SMMenuWindowServices& services, std::function<KXRect()> statusItemFrame)
     : m_windowServer(services.windowServer)
     , m_clock(services.clock)
+    , m_statusItemFrame(std::move(statusItemFrame))
     , m_painter(services.userDefaults) {
     InstallMenuAccessibility();
     m_ui.setupUi(&m_view);
     if (menuIsMirrored()) mirrorMargins(m_view);
-    m_window =
-        std::make_unique<SMBorderlessWindow>(services.windowServer, m_view, std::move(statusItemFrame));
+    m_window = std::make_unique<SMBorderlessWindow>(services.windowServer, m_view, m_statusItemFrame);
     const std::initializer_list<SMMenuHostWidget*> hosts = {
         &m_view, m_ui.leftMenuCollectionView, m_ui.rightMenuBox, m_ui.settingsButton, m_ui.actionButton};
     for (SMMenuHostWidget* host : hosts)

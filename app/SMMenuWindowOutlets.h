@@ -66,6 +66,7 @@ public:
     virtual KXRect frame() const = 0;
     /// Lays the parts out at once, and gives the lists that are shown their new size.
     virtual void setFrame(const KXRect& frame) = 0;
+    /// Of the screen that the status item is on.
     virtual KXRect visibleScreenFrame() const = 0;
     /// With the keyboard in the search field.
     virtual void makeKeyAndOrderFront() = 0;

@@ -2,12 +2,21 @@
 #include "app/SMEditingCommand.h"
 
 #include "app/menuMirroring.h"
+#include "app/menuPicture.h"
 
 #include <QKeyEvent>
+#include <QPainter>
+#include <QStyle>
 #include <optional>
 #include <string>
 
 namespace {
+
+constexpr int fontSize = 12;
+constexpr int textMargin = 9;
+constexpr QColor selection(0x3B, 0x6A, 0xF0);
+constexpr QColor outline(0, 0, 0, 110);
+constexpr QColor placeholderColor(0, 0, 0, 128);
 
 struct KeyCommand {
     int key;
@@ -36,6 +45,17 @@ std::optional<SMEditingCommand> commandOf(const QKeyEvent& event) {
 
 SMSearchField::SMSearchField(QWidget* parent)
     : QLineEdit(parent) {
+    setFrame(false);
+    setTextMargins(textMargin, 0, textMargin, 0);
+    QFont text = font();
+    text.setPixelSize(fontSize);
+    setFont(text);
+    QPalette colors = palette();
+    colors.setColor(QPalette::Base, Qt::transparent);
+    colors.setColor(QPalette::Text, Qt::black);
+    colors.setColor(QPalette::Highlight, selection);
+    colors.setColor(QPalette::HighlightedText, Qt::white);
+    setPalette(colors);
     connect(this, &QLineEdit::textChanged, this, [this] {
         if (m_textHandler && !m_isSetFromCode) m_textHandler();
     });
@@ -45,6 +65,34 @@ void SMSearchField::setStringValue(const std::string& value) {
     m_isSetFromCode = true;
     setText(QString::fromStdString(value));
     m_isSetFromCode = false;
+}
+
+void SMSearchField::paintEvent(QPaintEvent* event) {
+    const bool isEmpty = displayText().isEmpty();
+    if (isEmpty != m_isDrawnEmpty) {
+        m_isDrawnEmpty = isEmpty;
+        m_picture.invalidate();
+    }
+    {
+        QPainter painter(this);
+        m_picture.draw(painter, *this, [this](QPainter& onPicture) { drawField(onPicture); });
+    }
+    QLineEdit::paintEvent(event);
+}
+
+void SMSearchField::drawField(QPainter& painter) const {
+    const QRectF inner = QRectF(rect()).adjusted(0.5, 0.5, -0.5, -0.5);
+    painter.setRenderHint(QPainter::Antialiasing);
+    painter.setPen(outline);
+    painter.setBrush(Qt::white);
+    painter.drawRoundedRect(inner, inner.height() / 2, inner.height() / 2);
+    if (!m_isDrawnEmpty) return;
+    constexpr int besideText = 2; // as the toolkit has it
+    const QRect room = rect().adjusted(textMargin + besideText, 0, -textMargin - besideText, 0);
+    painter.setFont(font());
+    painter.setPen(placeholderColor);
+    const auto leading = QStyle::visualAlignment(layoutDirection(), Qt::AlignLeft | Qt::AlignVCenter);
+    painter.drawText(room, static_cast<int>(leading) | Qt::TextSingleLine, m_placeholder);
 }
 
 bool SMSearchField::event(QEvent* event) {

@@ -1,6 +1,7 @@
 #pragma once
 
 #include "app/SMEditingCommand.h"
+#include "app/menuPicture.h"
 
 #include <QLineEdit>
 #include <functional>
@@ -18,13 +19,22 @@ public:
     /// Called when the user has changed the text, not after `setStringValue`.
     void setTextHandler(std::function<void()> handler) { m_textHandler = std::move(handler); }
 
+    /// Kept here: the toolkit would lay it out anew at every painting.
+    void setPlaceholderText(const QString& text) { m_placeholder = text; }
+
     std::string stringValue() const { return text().toStdString(); }
     void setStringValue(const std::string& value);
 
 protected:
     bool event(QEvent* event) override;
+    void paintEvent(QPaintEvent* event) override;
 
 private:
+    void drawField(QPainter& painter) const;
+
+    MenuPicture m_picture;
+    bool m_isDrawnEmpty = true;
+    QString m_placeholder;
     CommandHandler m_commandHandler;
     std::function<void()> m_textHandler;
     bool m_isSetFromCode = false;

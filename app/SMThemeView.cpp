@@ -2,6 +2,7 @@
 
 #include "app/SMMenuHostWidget.h"
 #include "app/menuPainter.h"
+#include "app/menuPicture.h"
 #include "lib/base/Geometry.h"
 #include "lib/kxAppKit/KXBezierPath.h"
 #include "lib/kxAppKit/KXColor.h"
@@ -33,14 +34,14 @@ SMThemeView::SMThemeView(QWidget* parent)
 void SMThemeView::setPanes(const Panes& panes) {
     if (panes == m_panes) return;
     m_panes = panes;
-    m_chrome = {};
+    m_chrome.invalidate();
     update();
 }
 
 void SMThemeView::setBackgroundImage(QImage image) {
     if (image.isNull() && m_backgroundImage.isNull()) return;
     m_backgroundImage = std::move(image);
-    m_chrome = {};
+    m_chrome.invalidate();
     update();
 }
 
@@ -64,18 +65,13 @@ QPainterPath SMThemeView::outline() const {
 }
 
 void SMThemeView::paintEvent(QPaintEvent*) {
-    if (m_chrome.isNull() || m_chromeVariant != tools().colorVariant()) {
-        m_chromeVariant = tools().colorVariant();
-        const double ratio = devicePixelRatioF();
-        m_chrome = QPixmap((QSizeF(size()) * ratio).toSize());
-        m_chrome.setDevicePixelRatio(ratio);
-        m_chrome.fill(Qt::transparent);
-        QPainter painter(&m_chrome);
-        drawChrome(painter);
+    if (const int variant = tools().colorVariant(); variant != m_chromeVariant) {
+        m_chromeVariant = variant;
+        m_chrome.invalidate();
     }
     QPainter painter(this);
     painter.setCompositionMode(QPainter::CompositionMode_Source);
-    painter.drawPixmap(0, 0, m_chrome);
+    m_chrome.draw(painter, *this, [this](QPainter& onPicture) { drawChrome(onPicture); });
 }
 
 void SMThemeView::drawChrome(QPainter& painter) const {
@@ -147,7 +143,7 @@ void SMThemeView::updateShape() {
     if (m_shapeSize == size() && m_isShapeTranslucent == translucent) return;
     m_shapeSize = size();
     m_isShapeTranslucent = translucent;
-    m_chrome = {};
+    m_chrome.invalidate();
     // Without a compositor the corners of a see-through window would be black.
     if (translucent)
         clearMask();

@@ -2,10 +2,10 @@
 
 #include "app/SMMenuHostWidget.h"
 #include "app/SMMenuWindowOutlets.h"
+#include "app/menuPicture.h"
 #include "lib/kxAppKit/KXBezierPath.h"
 
 #include <QImage>
-#include <QPixmap>
 
 /// The window's content view: clips to the window's outline, paints the background and the panes, and tells
 /// the mouse to the window's delegate.
@@ -57,7 +57,7 @@ private:
     SMMenuWindowEvents* m_delegate = nullptr;
     Panes m_panes;
     QImage m_backgroundImage;
-    QPixmap m_chrome; ///< all of it; null when it must be painted anew
+    MenuPicture m_chrome; ///< all of it
     int m_chromeVariant = 0;
     QSize m_shapeSize;
     bool m_isShapeTranslucent = false;

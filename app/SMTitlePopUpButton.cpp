@@ -1,6 +1,7 @@
 #include "app/SMTitlePopUpButton.h"
 
 #include "app/menuMirroring.h"
+#include "app/menuPicture.h"
 #include "lib/base/Geometry.h"
 #include "lib/kxAppKit/KXBezierPath.h"
 
@@ -25,13 +26,22 @@ SMTitlePopUpButton::SMTitlePopUpButton(QWidget* parent)
 }
 
 void SMTitlePopUpButton::paintEvent(QPaintEvent*) {
+    if (const QString title = currentText(); title != m_drawnTitle) {
+        m_drawnTitle = title;
+        m_picture.invalidate();
+    }
+    QPainter painter(this);
+    m_picture.draw(painter, *this, [this](QPainter& onPicture) { drawTitle(onPicture); });
+}
+
+void SMTitlePopUpButton::drawTitle(QPainter& painter) const {
     QFont titleFont = font();
     titleFont.setBold(true);
     titleFont.setPixelSize(12);
     const QFontMetricsF metrics(titleFont);
-    const QString title = currentText();
     const double titleHeight = std::ceil(metrics.height());
-    const double titleWidth = std::min(std::ceil(metrics.horizontalAdvance(title)), width() - titleRoom);
+    const double titleWidth =
+        std::min(std::ceil(metrics.horizontalAdvance(m_drawnTitle)), width() - titleRoom);
     KXRect titleRect{titleInset, static_cast<float>(std::round((height() - titleHeight) * 0.5) - 1),
                      static_cast<float>(titleWidth), static_cast<float>(titleHeight)};
     KXRect arrow{titleRect.maxX() + arrowGap,
@@ -42,12 +52,11 @@ void SMTitlePopUpButton::paintEvent(QPaintEvent*) {
         arrow = menuMirrored(arrow, static_cast<float>(width()));
     }
 
-    QPainter painter(this);
     painter.setFont(titleFont);
     painter.setPen(Qt::white);
     painter.drawText(QRectF(titleRect.x, titleRect.y, titleRect.width, titleRect.height),
                      Qt::AlignLeft | Qt::TextSingleLine,
-                     metrics.elidedText(title, Qt::ElideMiddle, titleWidth));
+                     metrics.elidedText(m_drawnTitle, Qt::ElideMiddle, titleWidth));
     painter.setRenderHint(QPainter::Antialiasing);
     // "Up" is not the wrong way round: y grows downwards here, so the arrow points down.
     KXBezierPath::arrowInRect(arrow, KXArrowDirectionUp).fill(painter, Qt::white);

@@ -1,5 +1,7 @@
 #pragma once
 
+#include "app/menuPicture.h"
+
 #include <QComboBox>
 
 /// A pop-up list that shows its choice as a white title with an arrow, and nothing around it.
@@ -11,4 +13,10 @@ protected:
     void paintEvent(QPaintEvent* event) override;
     /// The wheel scrolls the menu, wherever the pointer is.
     void wheelEvent(QWheelEvent* event) override;
+
+private:
+    void drawTitle(QPainter& painter) const;
+
+    MenuPicture m_picture;
+    QString m_drawnTitle;
 };

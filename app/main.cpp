@@ -5,6 +5,7 @@
 #include "app/SMMenuWindowOwner.h"
 #include "app/SMOptions.h"
 #include "app/doctorReport.h"
+#include "app/menuPainter.h"
 #include "lib/base/ExceptionLogging.h"
 #include "lib/base/Log.h"
 #include "lib/ipc/KXIPCClient.h"
@@ -132,6 +133,8 @@ private:
             [this](SMMenuWindowOwner& owner) { return SMMakeMenuWindow(owner, m_windowServices); },
         .holdTyping = [] { return platform::XcbHoldTyping(); },
         .terminate = [this] { terminate(); },
+        .mainLoop = m_mainLoop,
+        .prepareFonts = MenuPainter::prepareFonts,
     }};
     platform::TerminationSignals m_signals{m_mainLoop, [this] { terminate(); }};
     QObject m_connections; ///< ends first, and with it the calls from the application object

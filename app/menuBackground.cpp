@@ -1,7 +1,9 @@
 #include "app/menuBackground.h"
 
+#include "lib/raster/rasterScale.h"
+#include "lib/raster/rasterops.h"
+
 #include <algorithm>
-#include <array>
 #include <cmath>
 #include <vector>
 
@@ -10,28 +12,20 @@ namespace {
 /// Half of the 8 points, less what halving the picture and enlarging it again blur by themselves.
 constexpr double halfSizeSigma = 3.97;
 
+/// Four floats that are worked on at once.
 struct Pixel {
-    std::array<float, 4> channels{};
-
-    Pixel& operator+=(const Pixel& other) {
-        for (std::size_t i = 0; i < 4; ++i)
-            channels[i] += other.channels[i];
-        return *this;
-    }
-    Pixel& operator-=(const Pixel& other) {
-        for (std::size_t i = 0; i < 4; ++i)
-            channels[i] -= other.channels[i];
-        return *this;
-    }
+    using Channels = float __attribute__((vector_size(16)));
+    Channels channels{};
 };
 
 Pixel toPixel(QRgb rgb) {
-    return {{static_cast<float>(qBlue(rgb)), static_cast<float>(qGreen(rgb)), static_cast<float>(qRed(rgb)),
-             255}};
+    return {Pixel::Channels{static_cast<float>(qBlue(rgb)), static_cast<float>(qGreen(rgb)),
+                            static_cast<float>(qRed(rgb)), 255}};
 }
 
 QRgb toRgb(const Pixel& pixel) {
-    const auto level = [&](std::size_t i) { return static_cast<int>(pixel.channels[i] + 0.5F); };
+    const Pixel::Channels rounded = pixel.channels + 0.5F;
+    const auto level = [&](int i) { return static_cast<int>(rounded[i]); };
     return qRgb(level(2), level(1), level(0));
 }
 
@@ -54,17 +48,13 @@ struct Box {
 
     void average(const std::vector<Pixel>& in, std::vector<Pixel>& out) const {
         out.resize(in.size() - 2 * reach());
-        Pixel sum;
+        Pixel::Channels sum{};
         for (std::size_t i = 1; i < 2 * reach(); ++i)
-            sum += in[i];
+            sum += in[i].channels;
         for (std::size_t i = 0; i < out.size(); ++i) {
-            const Pixel& before = in[i];
-            const Pixel& after = in[i + 2 * reach()];
-            for (std::size_t k = 0; k < 4; ++k)
-                out[i].channels[k] =
-                    scale * (sum.channels[k] + outer * (before.channels[k] + after.channels[k]));
-            sum += after;
-            sum -= in[i + 1];
+            const Pixel::Channels after = in[i + 2 * reach()].channels;
+            out[i].channels = scale * (sum + outer * (in[i].channels + after));
+            sum += after - in[i + 1].channels;
         }
     }
 };
@@ -96,6 +86,18 @@ QImage blurredAndTransposed(const QImage& image, const Box& box) {
     return result;
 }
 
+QImage reduced(const QImage& image, QSize size) {
+    QImage small(size, QImage::Format_RGB32);
+    constexpr int bits = 32;
+    const bool scaled =
+        Raster_Scale(small.bits(), static_cast<int>(small.bytesPerLine()), bits, bits, small.width(),
+                     small.height(), 1, RasterRect::fromSize(0, 0, small.width(), small.height()),
+                     image.constBits(), static_cast<int>(image.bytesPerLine()), bits, bits, 0, image.width(),
+                     image.height(), 1, static_cast<double>(size.width()) / image.width(),
+                     static_cast<double>(size.height()) / image.height(), 1);
+    return scaled ? small : QImage();
+}
+
 } // namespace
 
 QImage blurredImage(const QImage& image, double sigma) {
@@ -107,9 +109,7 @@ QImage blurredImage(const QImage& image, double sigma) {
 QImage menuBackground(const QImage& screen) {
     if (screen.width() < 2) return {};
     const QSizeF half = screen.deviceIndependentSize() / 2;
-    QImage small =
-        screen.convertToFormat(QImage::Format_RGB32)
-            .scaled(half.toSize().expandedTo({1, 1}), Qt::IgnoreAspectRatio, Qt::SmoothTransformation);
-    small.setDevicePixelRatio(1);
-    return blurredImage(small, halfSizeSigma);
+    return blurredImage(
+        reduced(screen.convertToFormat(QImage::Format_RGB32), half.toSize().expandedTo({1, 1})),
+        halfSizeSigma);
 }

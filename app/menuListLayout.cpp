@@ -126,7 +126,8 @@ std::optional<std::size_t> scrollIndexUp(const MenuListState& state) {
 
 std::optional<std::size_t> scrollIndexDown(std::span<const MenuListRow> rows, const MenuListState& state) {
     const Arrangement arrangement(rows, state);
-    if (!fitRows(arrangement, state).scrollDown) return {};
+    // A list too low even for its arrows shows one at the end, too.
+    if (state.scrollIndex >= rows.size() || !fitRows(arrangement, state).scrollDown) return {};
     return std::min(state.scrollIndex + (arrangement.showsUp() ? 1 : 2), rows.size());
 }
 

@@ -7,9 +7,9 @@
 
 #include <QFontMetricsF>
 #include <QGuiApplication>
-#include <QLinearGradient>
 #include <QPainter>
 #include <QTextLayout>
+#include <QtMath>
 #include <algorithm>
 #include <cmath>
 #include <cstddef>
@@ -35,10 +35,20 @@ QColor grey(float white, float alpha) {
     return QColor::fromRgbF(white, white, white, alpha);
 }
 
-QColor toQt(const std::uint8_t (&components)[3], float alpha) {
-    QColor color(components[0], components[1], components[2]);
-    color.setAlphaF(alpha);
+/// The colour at `part` of the way down.
+QColor mixed(const MenuGradient& colors, double part) {
+    const auto channel = [&](std::size_t i) {
+        return qRound(colors.start[i] + part * (colors.end[i] - colors.start[i]));
+    };
+    QColor color(channel(0), channel(1), channel(2));
+    color.setAlphaF(colors.alpha);
     return color;
+}
+
+QFont menuFont() {
+    QFont font = QGuiApplication::font();
+    font.setPixelSize(fontSize);
+    return font;
 }
 
 QString singleLine(const std::string& text) {
@@ -59,6 +69,14 @@ QTextLine layOut(QTextLayout& layout) {
     return line;
 }
 
+/// One pixel of the picture is one of the device, so nothing is scaled again and the edges stay sharp.
+void drawPixels(QPainter& painter, const QImage& picture, QPointF corner, double ratio) {
+    const QTransform toDevice = painter.deviceTransform();
+    const QPointF device = toDevice.map(corner);
+    const QPointF snapped = toDevice.inverted().map(QPointF(std::round(device.x()), std::round(device.y())));
+    painter.drawImage(QRectF(snapped, QSizeF(picture.size()) / ratio), picture);
+}
+
 } // namespace
 
 const MenuGradient& menuGradient(MenuGradientUse use, int colorVariant) {
@@ -75,8 +93,13 @@ QRectF MenuHairline(const QPainter& painter, const QRectF& rect) {
 
 MenuPainter::MenuPainter(const platform::UserDefaults& defaults)
     : m_defaults(defaults)
-    , m_font(QGuiApplication::font()) {
-    m_font.setPixelSize(fontSize);
+    , m_font(menuFont()) {}
+
+void MenuPainter::prepareFonts(const std::string& text) {
+    QImage scratch(fontSize, fontSize, QImage::Format_ARGB32_Premultiplied);
+    QPainter painter(&scratch);
+    painter.setFont(menuFont());
+    painter.drawText(0, fontSize, singleLine(text));
 }
 
 int MenuPainter::colorVariant() const {
@@ -86,6 +109,7 @@ int MenuPainter::colorVariant() const {
 MenuPainter::Text& MenuPainter::textFor(const std::string& text) {
     if (const auto known = m_texts.find(text); known != m_texts.end()) return known->second;
     if (m_texts.size() >= keptTexts) m_texts.clear();
+    ++m_madeAnew;
     QTextLayout layout(singleLine(text), m_font);
     const QTextLine line = layOut(layout);
     Text& entry = m_texts[text];
@@ -109,16 +133,17 @@ void MenuPainter::drawText(QPainter& painter, const std::string& text, const KXR
     Text& entry = textFor(text);
     const float width = std::min(rect.width, entry.size.width);
     if (width <= 0) return;
-    if (entry.width != width) {
+    auto made = entry.glyphs.find(width);
+    if (made == entry.glyphs.end()) {
+        ++m_madeAnew;
         QString line = singleLine(text);
         if (width < entry.size.width) line = QFontMetricsF(m_font).elidedText(line, Qt::ElideRight, width);
         QTextLayout layout(line, m_font);
         layOut(layout);
-        entry.glyphs = layout.glyphRuns();
-        entry.width = width;
+        made = entry.glyphs.emplace(width, layout.glyphRuns()).first;
     }
     painter.setPen(pen(white));
-    for (const QGlyphRun& glyphs : entry.glyphs)
+    for (const QGlyphRun& glyphs : made->second)
         painter.drawGlyphRun({rect.x, rect.y}, glyphs);
 }
 
@@ -127,11 +152,24 @@ void MenuPainter::fillWhite(QPainter& painter, const KXRect& rect, float white, 
     painter.fillRect(area, grey(white, alpha));
 }
 
-void MenuPainter::fillArrow(QPainter& painter, const KXRect& rect, std::int32_t direction,
-                            float white) const {
+const QImage& MenuPainter::arrow(KXSize size, std::int32_t direction, float white, double ratio) {
+    QImage& picture =
+        m_arrows[{size.width, size.height, static_cast<float>(direction), white, static_cast<float>(ratio)}];
+    if (!picture.isNull()) return picture;
+    ++m_madeAnew;
+    picture =
+        QImage(qCeil(size.width * ratio), qCeil(size.height * ratio), QImage::Format_ARGB32_Premultiplied);
+    picture.fill(Qt::transparent);
+    QPainter painter(&picture);
     painter.setRenderHint(QPainter::Antialiasing);
-    KXBezierPath::arrowInRect(rect, direction).fill(painter, grey(white, 1));
-    painter.setRenderHint(QPainter::Antialiasing, false);
+    painter.scale(ratio, ratio);
+    KXBezierPath::arrowInRect({0, 0, size.width, size.height}, direction).fill(painter, grey(white, 1));
+    return picture;
+}
+
+void MenuPainter::fillArrow(QPainter& painter, const KXRect& rect, std::int32_t direction, float white) {
+    const double ratio = painter.device()->devicePixelRatioF();
+    drawPixels(painter, arrow(rect.size(), direction, white, ratio), QPointF(rect.x, rect.y), ratio);
 }
 
 void MenuPainter::fillHighlight(QPainter& painter, const KXRect& rect) const {
@@ -140,10 +178,16 @@ void MenuPainter::fillHighlight(QPainter& painter, const KXRect& rect) const {
 
 void MenuPainter::fillGradient(QPainter& painter, const KXRect& rect, MenuGradientUse use) const {
     const MenuGradient& colors = menuGradient(use, colorVariant());
-    QLinearGradient gradient(0, rect.minY(), 0, rect.maxY());
-    gradient.setColorAt(0, toQt(colors.start, colors.alpha));
-    gradient.setColorAt(1, toQt(colors.end, colors.alpha));
-    painter.fillRect(toQt(rect), gradient);
+    // Line by line: a gradient of the toolkit's would be made anew, with its table, at every painting.
+    const QTransform toDevice = painter.deviceTransform();
+    const QTransform fromDevice = toDevice.inverted();
+    const QRectF device = toDevice.mapRect(toQt(rect));
+    const int top = qRound(device.top());
+    const int bottom = qRound(device.bottom());
+    for (int y = top; y < bottom; ++y) {
+        const QRectF line(device.left(), y, device.width(), 1);
+        painter.fillRect(fromDevice.mapRect(line), mixed(colors, (y - top + 0.5) / (bottom - top)));
+    }
 }
 
 void MenuPainter::drawIcon(QPainter& painter, const KXImage& image, const KXRect& rect) const {
@@ -152,10 +196,6 @@ void MenuPainter::drawIcon(QPainter& painter, const KXImage& image, const KXRect
     const int side = qRound(extent * ratio);
     const QImage picture = image.squareImage(side);
     if (picture.isNull()) return;
-    // One pixel of the picture is one of the device, so nothing is scaled again and the edges stay sharp.
     const QPointF corner(rect.x - (extent - rect.width) / 2, rect.y - (extent - rect.height) / 2);
-    const QTransform toDevice = painter.deviceTransform();
-    const QPointF device = toDevice.map(corner);
-    const QPointF snapped = toDevice.inverted().map(QPointF(std::round(device.x()), std::round(device.y())));
-    painter.drawImage(QRectF(snapped, QSizeF(side / ratio, side / ratio)), picture);
+    drawPixels(painter, picture, corner, ratio);
 }

@@ -5,10 +5,14 @@
 #include <QFont>
 #include <QGlyphRun>
 #include <QHash>
+#include <QImage>
 #include <QList>
 #include <QPen>
 #include <QRectF>
+#include <array>
+#include <cstddef>
 #include <cstdint>
+#include <map>
 #include <string>
 #include <unordered_map>
 
@@ -40,6 +44,10 @@ public:
     /// `defaults` is borrowed.
     explicit MenuPainter(const platform::UserDefaults& defaults);
 
+    /// Loads the fonts that the text needs, and shapes and fills it once: the first text in a script takes
+    /// most of a frame.
+    static void prepareFonts(const std::string& text);
+
     /// The appearance the user has set.
     int colorVariant() const;
 
@@ -49,22 +57,27 @@ public:
     void drawText(QPainter& painter, const std::string& text, const KXRect& rect, float white);
 
     void fillWhite(QPainter& painter, const KXRect& rect, float white, float alpha) const;
-    void fillArrow(QPainter& painter, const KXRect& rect, std::int32_t direction, float white) const;
+    void fillArrow(QPainter& painter, const KXRect& rect, std::int32_t direction, float white);
     void fillHighlight(QPainter& painter, const KXRect& rect) const;
     void fillGradient(QPainter& painter, const KXRect& rect, MenuGradientUse use) const;
     void drawIcon(QPainter& painter, const KXImage& image, const KXRect& rect) const;
 
+    /// How many texts were shaped and arrows filled, because they were not kept from an earlier painting.
+    std::size_t madeAnew() const { return m_madeAnew; }
+
 private:
     struct Text {
         KXSize size;
-        float width = -1; ///< that the glyphs were made for
-        QList<QGlyphRun> glyphs;
+        std::map<float, QList<QGlyphRun>> glyphs; ///< by the width that they were made for
     };
     Text& textFor(const std::string& text);
     const QPen& pen(float white);
+    const QImage& arrow(KXSize size, std::int32_t direction, float white, double ratio);
 
     const platform::UserDefaults& m_defaults;
     QFont m_font;
     QHash<int, QPen> m_pens;
     std::unordered_map<std::string, Text> m_texts;
+    std::map<std::array<float, 5>, QImage> m_arrows; ///< by size, direction, grey and scale
+    std::size_t m_madeAnew = 0;
 };

@@ -16,7 +16,8 @@ public:
     /// The panel lost the keyboard, or a button was pressed outside of all windows of this process. One event
     /// may cause several calls, also after the panel was ordered out.
     virtual void panelDidResignKey() = 0;
-    /// Option was pressed or let go while the panel had the keyboard, after the panel itself has handled it.
+    /// Option was pressed or let go while the panel had the keyboard, after the panel itself has handled it;
+    /// also at every opening, as it then is.
     virtual void panelFlagsChanged(bool optionDown) = 0;
 
 protected:
@@ -50,8 +51,9 @@ class WindowServer {
 public:
     virtual ~WindowServer() = default;
 
-    /// The part of the main screen that bars and docks leave free; y upwards.
-    virtual KXRect visibleFrame() const = 0;
+    /// What bars, docks and the status item itself leave free of the screen that the item is on, of the main
+    /// one for an empty item; y upwards in both.
+    virtual KXRect visibleFrame(const KXRect& item) const = 0;
 
     /// Whether the display can blur what lies behind a panel. Found out once per process.
     virtual bool hasWindowFilter() const = 0;

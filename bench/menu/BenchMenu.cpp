@@ -1,15 +1,20 @@
-/// benchMenu [--filter]: the menu's real window on the display it is started on, timed from inside, from an
-/// event to a picture that the X server has taken. With --filter a compositing manager seems to blur behind
-/// windows; it must not run then. Prints "job<TAB>figure<TAB>unit" lines.
+/// benchMenu [--filter | --scripts | --scripts-warmed]: the menu's real window on the display it is started
+/// on, timed from inside, from an event to a picture that the X server has taken. With --filter a compositing
+/// manager seems to blur behind windows; it must not run then. With --scripts only what an opening in new
+/// scripts takes. Prints "job<TAB>figure<TAB>unit" lines.
 
 #include "app/SMMenuListWidget.h"
 #include "app/SMMenuWindowForm.h"
 #include "app/SMSearchField.h"
+#include "app/menuBackground.h"
+#include "app/menuFontWarmer.h"
+#include "app/menuPainter.h"
 #include "platform/UserDefaults.h"
 #include "platform/linux/QtMainLoop.h"
 #include "platform/linux/QtModifierKeys.h"
 #include "platform/linux/QtWindowServer.h"
 #include "platform/linux/SystemClock.h"
+#include "platform/linux/XcbCapture.h"
 #include "platform/linux/XcbConnection.h"
 
 #include <QApplication>
@@ -93,7 +98,10 @@ public:
         m_owner.contents.topMenu = applications(8);
         m_owner.contents.nameList = {"Guest"};
         takeUpdate(300);
-        m_window = SMMakeMenuWindow(m_owner, {m_server, m_clock, m_loop, m_keys, m_defaults});
+        warm(MenuPainter::prepareFonts);
+        m_making = milliseconds([this] {
+            m_window = SMMakeMenuWindow(m_owner, {m_server, m_clock, m_loop, m_keys, m_defaults});
+        });
         m_window->setFrame({801, 778 - m_window->frame().height, 480, m_window->frame().height});
         for (QWidget* widget : QApplication::topLevelWidgets())
             if (widget->objectName() == "menuWindow") m_view = widget;
@@ -134,9 +142,21 @@ public:
             }));
             close();
         }
-        report("first click to painted panel", plain.front(), "ms");
+        report("first click to painted panel, the window made in it", m_making + plain.front(), "ms");
         reportTimes("click to painted panel", plain);
         reportTimes("click to painted panel, with an update of 300 applications", updated);
+    }
+
+    void background() {
+        std::vector<double> capturing;
+        std::vector<double> blurring;
+        for (int round = 0; round < 51; ++round) {
+            QImage screen;
+            capturing.push_back(milliseconds([&] { screen = platform::XcbCapture({800, 22, 480, 550}); }));
+            blurring.push_back(milliseconds([&] { screen = menuBackground(screen); }));
+        }
+        report("of it the capture", percentile(capturing, 0.5), "ms");
+        report("of it the blur", percentile(blurring, 0.5), "ms");
     }
 
     void typing() {
@@ -154,8 +174,9 @@ public:
     }
 
     void repaint() {
+        m_owner.contents.searchableApps = applications(10000);
         open();
-        press(0, "e");
+        press(0, "a");
         auto* box = m_view->findChild<SMMenuListWidget*>("rightMenuBox");
         box->repaint();
         const auto allocationsOf = [box](const QRect& area) {
@@ -164,15 +185,51 @@ public:
             box->repaint(area);
             return static_cast<double>(allocations - before);
         };
-        const int height = box->height();
-        report("allocations in a repaint of half of the rows",
-               allocationsOf({0, height / 2, box->width(), height / 2}), "");
-        report("allocations in a repaint of all rows", allocationsOf(box->rect()), "");
+        const auto paintedRowsOf = [box](const QRect& area) {
+            const std::size_t before = box->paintedRows();
+            box->repaint(area);
+            return static_cast<double>(box->paintedRows() - before);
+        };
+        // The highlighted row is in neither.
+        const QRect some(0, box->height() / 2, box->width(), 40);
+        const QRect more(0, box->height() / 2, box->width(), 160);
+        const double rows = paintedRowsOf(more) - paintedRowsOf(some);
+        report("allocations for each row in a repaint", (allocationsOf(more) - allocationsOf(some)) / rows,
+               "");
+        report("allocations in a repaint of all rows, the toolkit's own among them",
+               allocationsOf(box->rect()), "");
+        report("rows painted in a repaint of 10,000", paintedRowsOf(box->rect()), "");
+        const std::size_t made = box->tools().madeAnew();
+        m_view->repaint();
+        report("made anew in a repaint of the unchanged panel",
+               static_cast<double>(box->tools().madeAnew() - made), "");
         std::vector<double> times;
         for (int round = 0; round < 51; ++round)
             times.push_back(milliseconds([this] { m_view->repaint(); }));
         report("repaint of the whole panel", percentile(times, 0.5), "ms");
         press(Qt::Key_Escape, {});
+        close();
+    }
+
+    /// An update in scripts that this process has not shown yet, after their fonts were made ready or not.
+    void newScripts(bool areWarmed) {
+        takeUpdate(300);
+        open();
+        close();
+        const std::vector<std::string> titles = {"한국어 입력기", "漢字變換", "नमस्ते", "โปรแกรม", "😀 Fun"};
+        SMMenuItems items;
+        for (const std::string& title : titles)
+            items.push_back(SMMenuItem::initWithDictionary(plist::Dictionary{{"title", title}}));
+        m_owner.contents.pinnedApps = std::make_shared<const SMMenuItems>(items);
+        double longest = 0;
+        if (areWarmed)
+            warm([&longest](const std::string& text) {
+                longest = std::max(longest, milliseconds([&] { MenuPainter::prepareFonts(text); }));
+            });
+        report(std::string("click to painted panel with five new scripts, ") +
+                   (areWarmed ? "warmed" : "not warmed"),
+               milliseconds([this] { open(); }), "ms");
+        if (areWarmed) report("longest turn of the warming", longest, "ms");
         close();
     }
 
@@ -194,6 +251,13 @@ public:
     }
 
 private:
+    /// As the agent does after an update.
+    void warm(std::function<void(const std::string& text)> shape) {
+        MenuFontWarmer warmer({m_loop, [] { return true; }, std::move(shape)});
+        warmer.take(m_owner.contents);
+        for (int turn = 0; turn < 50; ++turn)
+            QCoreApplication::processEvents();
+    }
     void takeUpdate(int count) {
         m_owner.contents.searchableApps = applications(count);
         m_owner.contents.pinnedApps = applications(5);
@@ -230,6 +294,7 @@ private:
     Defaults m_defaults;
     Owner m_owner;
     std::unique_ptr<SMMenuWindow> m_window;
+    double m_making = 0; ///< of the window
     QWidget* m_view = nullptr;
     SMSearchField* m_field = nullptr;
 };
@@ -245,10 +310,16 @@ int main(int argc, char** argv) {
     const auto root = platform::XcbRootWindow(c);
     if (filter) xcb_change_property(c, XCB_PROP_MODE_REPLACE, root, atom, XCB_ATOM_CARDINAL, 32, 0, nullptr);
     Bench bench;
+    const std::string_view option = argc > 1 ? argv[1] : "";
+    if (option.starts_with("--scripts")) {
+        bench.newScripts(option == "--scripts-warmed");
+        return 0;
+    }
     bench.opening();
     if (filter) {
         xcb_delete_property(c, root, atom);
     } else {
+        bench.background();
         bench.lists();
         bench.typing();
         bench.repaint();

@@ -36,6 +36,14 @@ KXRect PlacePanel(const KXRect& wanted, const KXRect& item, const KXRect& availa
             wanted.width, wanted.height};
 }
 
+KXRect RoomAtItem(const KXRect& item, const KXRect& available) {
+    const bool isAcross = item.width > 0 && item.minX() < available.maxX() && item.maxX() > available.minX();
+    const float below = item.minY() - available.minY();
+    const float above = available.maxY() - item.maxY();
+    if (!isAcross || below < 0 || above < 0) return available;
+    return {available.x, above > below ? item.maxY() : available.y, available.width, std::max(above, below)};
+}
+
 KXRect StatusItemFrameAt(std::optional<KXPoint> click, KXSize size, const KXRect& screen,
                          const KXRect& available) {
     const bool isBarAtBottom = available.maxY() >= screen.maxY() && available.minY() > screen.minY();

@@ -5,6 +5,7 @@
 #include "platform/linux/PanelPlacement.h"
 #include "platform/linux/QtScreenCoordinates.h"
 #include "platform/linux/ReducedMotion.h"
+#include "platform/linux/XcbCapture.h"
 #include "platform/linux/XcbPanel.h"
 
 #include <QAbstractNativeEventFilter>
@@ -63,6 +64,7 @@ public:
             m_activeBefore = XcbActiveWindow();
             m_focusBefore = XcbInputFocus();
             followCompositor();
+            tellOption(); // it may have changed while another window had the keyboard
         }
         place();
         m_view.show();
@@ -92,6 +94,13 @@ public:
         // The point past the right edge is not there to be seen.
         const QRect seen = m_view.geometry().intersected(screen->geometry());
         const QPoint corner = seen.topLeft() - screen->geometry().topLeft();
+        const double scale = screen->devicePixelRatio();
+        const QRectF native(screen->geometry().topLeft() + QPointF(corner) * scale,
+                            QSizeF(seen.size()) * scale);
+        if (QImage picture = XcbCapture(native.toRect()); !picture.isNull()) {
+            picture.setDevicePixelRatio(scale);
+            return picture;
+        }
         return screen->grabWindow(0, corner.x(), corner.y(), seen.width(), seen.height()).toImage();
     }
 
@@ -127,13 +136,18 @@ private:
     bool eventFilter(QObject* watched, QEvent* event) override {
         if (watched == &m_view && event->type() == QEvent::WindowDeactivate) m_delegate.panelDidResignKey();
         const bool isKeyEvent = event->type() == QEvent::KeyPress || event->type() == QEvent::KeyRelease;
-        if (isKeyEvent && watched == m_view.windowHandle() &&
-            static_cast<const QKeyEvent*>(event)->key() == Qt::Key_Alt) {
-            const bool down = event->type() == QEvent::KeyPress;
-            QMetaObject::invokeMethod(
-                this, [this, down] { m_delegate.panelFlagsChanged(down); }, Qt::QueuedConnection);
+        if (isKeyEvent && watched == m_view.windowHandle()) {
+            // With Shift held the key of Option is called Meta.
+            const int key = static_cast<const QKeyEvent*>(event)->key();
+            if (key == Qt::Key_Alt || key == Qt::Key_Meta)
+                QMetaObject::invokeMethod(
+                    this, [this] { tellOption(); }, Qt::QueuedConnection);
         }
         return false;
+    }
+
+    void tellOption() {
+        m_delegate.panelFlagsChanged(QGuiApplication::queryKeyboardModifiers().testFlag(Qt::AltModifier));
     }
 
     bool nativeEventFilter(const QByteArray& eventType, void* message, qintptr*) override {
@@ -163,9 +177,10 @@ private:
 
 } // namespace
 
-KXRect QtWindowServer::visibleFrame() const {
-    const QScreen* screen = QGuiApplication::primaryScreen();
-    return screen ? ScreenRectFromQt(screen->availableGeometry()) : KXRect{};
+KXRect QtWindowServer::visibleFrame(const KXRect& item) const {
+    const QScreen* screen =
+        item.width > 0 ? ScreenAt(QtRectFromScreen(item).center()) : QGuiApplication::primaryScreen();
+    return screen ? RoomAtItem(item, ScreenRectFromQt(screen->availableGeometry())) : KXRect{};
 }
 
 bool QtWindowServer::hasWindowFilter() const {

@@ -9,7 +9,7 @@ namespace platform {
 /// window.
 class QtWindowServer final : public WindowServer {
 public:
-    KXRect visibleFrame() const override;
+    KXRect visibleFrame(const KXRect& item) const override;
     bool hasWindowFilter() const override;
     bool reducesMotion() const override;
     std::unique_ptr<PanelWindow> makePanel(QWidget& contentView, PanelDelegate& delegate,

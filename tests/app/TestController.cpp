@@ -87,6 +87,7 @@ protected:
     FakeStatusBar bar{record};
     AgentClient* client = nullptr;
     FakeMenuWindow* window = nullptr;
+    std::unique_ptr<platform::Handle> turn;
     SMController controller{{
         .systemStatusBar = bar,
         .sharedWorkspace = workspace,
@@ -104,6 +105,12 @@ protected:
             },
         .holdTyping = [] { return nullptr; },
         .terminate = [this] { record.emplace_back("end the agent"); },
+        .mainLoop = wire.mainLoop,
+        .prepareFonts =
+            [this](const std::string& text) {
+                record.push_back("fonts for " + text);
+                turn = wire.mainLoop.startTimer({}, {}, [this] { record.emplace_back("a turn"); });
+            },
     }};
 };
 
@@ -211,6 +218,26 @@ TEST_F(Controller, ReplacesItsModelWithEveryUpdate) {
     EXPECT_TRUE(model.allProgramsMenu->submenu()->empty()) << "an empty tree is a tree";
     client->receive("menu.update");
     EXPECT_EQ(model.allProgramsMenu, nullptr);
+}
+
+TEST_F(Controller, PreparesFontsOfNewScriptsOneInATurnWhileTheMenuIsHidden) {
+    launch();
+    const auto update = [this](const char* title) {
+        const Value deep = Dictionary{{"submenuInfoArray", Array{Dictionary{{"title", title}}}}};
+        client->receive("menu.update", Dictionary{{"menu", Dictionary{{"allPrograms", Array{deep}}}}});
+        wire.mainLoop.runPending();
+        return happened();
+    };
+    EXPECT_THAT(update("Mail 日本 mail, café 😀"),
+                ElementsAre("fonts for Mail 日本 ", "a turn", "fonts for 日本 mail,", "a turn", "fonts for 😀",
+                            "a turn"));
+    EXPECT_THAT(update("日 Post 😁"), ElementsAre()) << "known";
+    controller.onStatusItemClicked();
+    record.clear();
+    EXPECT_THAT(update("почта"), ElementsAre("reloadData"));
+    controller.closeMenuWindow();
+    wire.mainLoop.runPending();
+    EXPECT_THAT(happened(), ElementsAre("hide", "hide", "fonts for почта", "a turn"));
 }
 
 TEST_F(Controller, PassesTheUsersChoicesOn) {

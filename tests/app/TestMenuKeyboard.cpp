@@ -1,6 +1,7 @@
 #include "tests/app/MenuFixtures.h"
 
 #include <gtest/gtest.h>
+#include <random>
 
 namespace {
 
@@ -97,18 +98,34 @@ TEST_F(MenuKeyboard, JumpsBetweenThePanesAtTheSameHeightWithoutText) {
     EXPECT_FALSE(press(moveLeft)) << "moves the caret";
 }
 
-TEST_F(MenuKeyboard, ScrollsAtTheEndsOfTheListAndReachesEveryRow) {
-    owner.contents.searchableApps = listTitled(numbered("App ", 60));
-    type("app");
-    EXPECT_EQ(highlighted(), "App 0");
-    for (int i = 1; i < 61; ++i) {
-        EXPECT_TRUE(press(moveDown));
-        EXPECT_EQ(highlighted(), "App " + std::to_string(std::min(i, 59)));
-        EXPECT_FALSE(menu->currentMouseOverMenuButton()->isHidden());
+TEST_F(MenuKeyboard, ReachesEveryRowByDownAlone) {
+    std::mt19937 random(5);
+    constexpr const char* stems[] = {"Mail ", "Музыка ", "بريد ", "漢字 ", "한국어 "};
+    for (int round = 0; round < 60; ++round) {
+        SMMenuItems rows;
+        Titles reachable;
+        for (auto n = 1 + random() % 50; n > 0; --n) {
+            const auto kind = random() % 8;
+            const std::string title = stems[kind % 5] + std::to_string(n);
+            rows.push_back(kind == 0 ? SMMenuItem::separatorItem()
+                                     : itemTitled(title, {{"enabled", kind > 1}}));
+            if (kind > 1) reachable.push_back(title);
+        }
+        owner.contents.allProgramsMenu = SMMenuItem::initWithSubmenu(rows);
+        menu->setFrame({0, 0, 480, static_cast<float>(160 + random() % 500)});
+        menu->showMenuWindow(); // which leaves the last folder
+        clickAction();
+        for (const std::string& title : reachable) {
+            press(moveDown);
+            ASSERT_EQ(highlighted(), title);
+            ASSERT_FALSE(menu->currentMouseOverMenuButton()->isHidden());
+        }
+        for (auto title = reachable.rbegin(); title != reachable.rend(); ++title) {
+            ASSERT_EQ(highlighted(), *title);
+            press(moveUp);
+        }
+        ASSERT_EQ(highlighted(), "Back");
     }
-    for (int i = 0; i < 60; ++i)
-        press(moveUp);
-    EXPECT_EQ(highlighted(), "Back");
 }
 
 TEST_F(MenuKeyboard, ActsOnTheItemEvenWhileItsAlternateShows) {

@@ -1,76 +1,56 @@
 #include "app/menuListLayout.h"
 
+#include <algorithm>
+#include <cmath>
 #include <gtest/gtest.h>
+#include <numeric>
 #include <random>
 
 namespace {
 
-std::vector<MenuListRow> rowsOf(std::size_t count, float height = 20) {
-    return std::vector<MenuListRow>(count, MenuListRow{height, false});
-}
-
-MenuListState stateOf(float height, std::size_t scrollIndex = 0) {
+struct List {
+    std::vector<MenuListRow> rows;
     MenuListState state;
-    state.height = height;
-    state.scrollIndex = scrollIndex;
-    return state;
-}
 
-std::size_t visibleCount(const MenuListLayout& layout) {
-    return static_cast<std::size_t>(
-        std::count_if(layout.places.begin(), layout.places.end(), [](const auto& p) { return !p.hidden; }));
-}
+    List(std::size_t count, float height, std::size_t scrollIndex = 0)
+        : rows(count, MenuListRow{20, false}) {
+        state.height = height;
+        state.scrollIndex = scrollIndex;
+    }
+    MenuListLayout layout() const { return layoutMenuList(rows, state); }
+};
 
 TEST(MenuListLayout, ReplacesTheLastRowThatFitsByAnArrow) {
-    EXPECT_FALSE(layoutMenuList(rowsOf(5), stateOf(100)).scrollDown) << "an exact fit";
-    const auto layout = layoutMenuList(rowsOf(6), stateOf(100));
-    EXPECT_EQ(layout.scrollDown, 4U);
-    EXPECT_EQ(layout.places[4].y, 0);
-    EXPECT_EQ(layout.places[5].y, -20);
-    EXPECT_EQ(visibleCount(layout), 5U);
-    EXPECT_EQ(layoutMenuList(rowsOf(6), stateOf(115)).places[4].y, 0)
-        << "on the edge, with room to spare too";
+    EXPECT_FALSE(List(5, 100).layout().scrollDown) << "an exact fit";
+    for (const float height : {100.0F, 115.0F}) {
+        const auto layout = List(6, height).layout();
+        EXPECT_EQ(layout.scrollDown, 4U);
+        EXPECT_EQ(layout.places[4].y, 0) << "on the edge, with room to spare too";
+        EXPECT_EQ(layout.places[5].y, -20);
+    }
 }
 
 TEST(MenuListLayout, GivesSpareHeightToFlexibleRows) {
-    auto rows = rowsOf(4);
-    rows[1].flexible = true;
-    auto layout = layoutMenuList(rows, stateOf(200));
-    EXPECT_EQ(layout.places[1].height, 140) << "spare 120 and the last row's 20";
-    EXPECT_EQ(layout.places[3].y, 0);
-
-    rows[2].flexible = true;
-    rows.back().height = 16;
-    layout = layoutMenuList(rows, stateOf(201));
-    EXPECT_EQ(layout.places[1].height, 70) << "(125 + 16) / 2, rounded down";
-    EXPECT_EQ(layoutMenuList(rows, stateOf(76)).places[1].height, 0) << "nothing to spare";
+    List list(4, 200);
+    list.rows[1].flexible = true;
+    EXPECT_EQ(list.layout().places[1].height, 140) << "spare 120 and the last row's 20";
+    EXPECT_EQ(list.layout().places[3].y, 0);
+    list.rows[2].flexible = true;
+    list.rows.back().height = 16;
+    list.state.height = 201;
+    EXPECT_EQ(list.layout().places[1].height, 70) << "(125 + 16) / 2, rounded down";
+    list.state.height = 76;
+    EXPECT_EQ(list.layout().places[1].height, 0) << "nothing to spare";
 }
 
-TEST(MenuListLayout, SurvivesListsTooLowForAnything) {
-    for (const float height : {0.0F, 5.0F, 19.0F}) {
-        for (const std::size_t index : {0U, 1U, 3U, 4U}) {
-            const auto layout = layoutMenuList(rowsOf(4), stateOf(height, index));
-            EXPECT_EQ(visibleCount(layout), 0U) << height << " " << index;
-        }
-    }
-    EXPECT_TRUE(layoutMenuList({}, stateOf(100)).places.empty());
-}
-
-struct RandomList {
-    std::vector<MenuListRow> rows;
-    MenuListState state;
-};
-
-RandomList randomList(std::mt19937& random) {
+List randomList(std::mt19937& random, std::size_t lowest) {
     const auto below = [&](std::size_t limit) { return random() % limit; };
-    RandomList list;
+    List list(below(60), static_cast<float>(lowest + below(600)));
     constexpr float heights[] = {10, 16, 20, 40};
-    for (std::size_t n = below(60); n > 0; --n)
-        list.rows.push_back({heights[below(4)], false});
-    list.state.height = static_cast<float>(30 + below(600));
-    list.state.scrollIndex = below(list.rows.size() + 1);
     list.state.disallowScrolling = below(4) == 0;
-    if (list.state.disallowScrolling) list.state.scrollIndex = 0;
+    for (auto& row : list.rows)
+        row = {heights[below(4)], list.state.disallowScrolling && below(20) == 0};
+    if (!list.state.disallowScrolling) list.state.scrollIndex = below(list.rows.size() + 1);
     if (below(2)) list.state.topSeparatorHeight = 10.0F;
     return list;
 }
@@ -78,47 +58,52 @@ RandomList randomList(std::mt19937& random) {
 TEST(MenuListLayout, LosesNoRowKeepsTheOrderAndNeverOverlaps) {
     std::mt19937 random(7);
     for (int round = 0; round < 3000; ++round) {
-        auto [rows, state] = randomList(random);
-        if (!rows.empty() && state.disallowScrolling) rows[random() % rows.size()].flexible = true;
-        const auto layout = layoutMenuList(rows, state);
-        const std::size_t extra = std::size_t{layout.topSeparator.has_value()} + layout.scrollUp.has_value() +
-                                  layout.scrollDown.has_value();
-        ASSERT_EQ(layout.places.size(), rows.size() + extra);
-        float edge = state.height;
-        for (const auto& place : layout.places) {
+        const List list = randomList(random, 30);
+        const auto layout = list.layout();
+        std::vector<float> heights; // what is not flexible, from the top down
+        for (const auto& row : list.rows)
+            heights.push_back(row.flexible ? -1 : row.height);
+        const auto insert = [&](std::optional<std::size_t> at, float height) {
+            if (at) heights.insert(heights.begin() + static_cast<std::ptrdiff_t>(*at), height);
+        };
+        insert(layout.topSeparator, 10);
+        insert(layout.scrollUp, 20);
+        insert(layout.scrollDown, 20);
+        ASSERT_EQ(layout.places.size(), heights.size());
+        float edge = INFINITY;
+        for (std::size_t i = 0; i < heights.size(); ++i) {
+            const auto& place = layout.places[i];
+            EXPECT_TRUE(heights[i] < 0 || place.height == heights[i]);
+            EXPECT_EQ(place.hidden, place.y < 0 || place.y + place.height > list.state.height);
             if (place.hidden) continue;
             EXPECT_LE(place.y + place.height, edge);
-            EXPECT_GE(place.y, 0);
             edge = place.y;
         }
     }
 }
 
+bool isHidden(const List& list, std::size_t row) {
+    const auto layout = list.layout();
+    for (const auto& extra : {layout.topSeparator, layout.scrollUp, layout.scrollDown})
+        if (extra && *extra <= row) ++row;
+    return layout.places[row].hidden;
+}
+
 TEST(MenuListLayout, FindsTheScrollIndexThatSteppingWouldReach) {
     std::mt19937 random(11);
-    const auto isHidden = [](const auto& rows, const MenuListState& state, std::size_t target) {
-        const auto layout = layoutMenuList(rows, state);
-        std::size_t at = target;
-        for (const auto& extra : {layout.topSeparator, layout.scrollUp, layout.scrollDown})
-            if (extra && *extra <= at) ++at;
-        return layout.places[at].hidden;
-    };
     for (int round = 0; round < 1500; ++round) {
-        auto [rows, state] = randomList(random);
-        if (rows.empty()) continue;
-        const std::size_t target = random() % rows.size();
-        auto stepped = state;
-        while (isHidden(rows, stepped, target)) {
-            const auto next = scrollIndexUp(stepped);
-            if (!next) break;
-            stepped.scrollIndex = *next;
-        }
-        while (isHidden(rows, stepped, target)) {
-            const auto next = scrollIndexDown(rows, stepped);
-            if (!next) break;
-            stepped.scrollIndex = *next;
-        }
-        ASSERT_EQ(scrollIndexShowing(rows, state, target), stepped.scrollIndex) << round;
+        const List list = randomList(random, 0);
+        if (list.rows.empty() || list.state.disallowScrolling) continue;
+        const std::size_t target = random() % list.rows.size();
+        List stepped = list;
+        auto& index = stepped.state.scrollIndex;
+        for (auto next = scrollIndexUp(stepped.state); next && isHidden(stepped, target);
+             next = scrollIndexUp(stepped.state))
+            index = *next;
+        for (auto next = scrollIndexDown(stepped.rows, stepped.state); next && isHidden(stepped, target);
+             next = scrollIndexDown(stepped.rows, stepped.state))
+            index = *next;
+        ASSERT_EQ(scrollIndexShowing(list.rows, list.state, target), index) << round;
     }
 }
 

@@ -1,26 +1,22 @@
-#include "app/SMMenuListWidget.h"
-#include "app/SMMenuWindowForm.h"
 #include "app/SMThemeView.h"
-#include "platform/UserDefaults.h"
 #include "platform/WindowServer.h"
-#include "tests/app/MenuFixtures.h"
+#include "tests/app/PanelFixtures.h"
 #include "tests/support/GuiApplication.h"
 
-#include <QApplication>
+#include <QAction>
+#include <QComboBox>
 #include <QTest>
 #include <gtest/gtest.h>
 
 namespace {
 
-struct NoDefaults final : platform::UserDefaults {
-    int integerForKey(const std::string&) const override { return 0; }
-};
+using Log = std::vector<std::string>;
 
 /// Shows panels as plain windows and writes down what is asked of it.
 struct FakeWindowServer final : platform::WindowServer {
     bool filter = false;
     bool still = false;
-    std::vector<std::string> log;
+    Log log;
 
     struct Panel final : platform::PanelWindow {
         FakeWindowServer& server;
@@ -49,7 +45,7 @@ struct FakeWindowServer final : platform::WindowServer {
         }
     };
 
-    KXRect visibleFrame() const override { return {0, 0, 1280, 800}; }
+    KXRect visibleFrame(const KXRect&) const override { return {0, 0, 1280, 800}; }
     bool hasWindowFilter() const override { return filter; }
     bool reducesMotion() const override { return still; }
     std::unique_ptr<platform::PanelWindow> makePanel(QWidget& view, platform::PanelDelegate&,
@@ -58,43 +54,31 @@ struct FakeWindowServer final : platform::WindowServer {
     }
 };
 
-struct MenuPanel : testing::Test {
+struct MenuPanel : testing::Test, PanelWorld {
     MenuPanel() {
         ensureGuiApplication();
+        owner.contents.topMenu = listTitled({"Documents"});
         owner.contents.pinnedApps = listTitled({"Mail", "Web"});
-        const auto programs =
-            plist::Dictionary{{"title", "All"}, {"submenuInfoArray", plist::Array{leafInfo("Editor")}}};
-        owner.contents.allProgramsMenu = SMMenuItem::initWithDictionary(programs);
-    }
-    std::unique_ptr<SMMenuWindow> makeWindow() {
-        auto made = SMMakeMenuWindow(owner, {server, loop.clock(), loop, keys, defaults});
-        for (QWidget* widget : QApplication::topLevelWidgets())
-            if (widget->objectName() == "menuWindow") view = static_cast<SMThemeView*>(widget);
-        box = view->findChild<SMMenuListWidget*>("rightMenuBox");
-        return made;
+        owner.contents.searchableApps = listTitled({"Mail", "Web", "Editor"});
+        owner.contents.nameList = {"one", "two", "three"};
+        owner.contents.allProgramsMenu =
+            SMMenuItem::initWithDictionary(folderInfo("All", {leafInfo("Editor")}));
+        makeWindow(server);
     }
     void clickAction() {
-        const auto* button = view->findChild<QWidget*>("actionButton");
+        const auto* button = widget("actionButton");
         QTest::mouseClick(view, Qt::LeftButton, {}, button->mapTo(view, button->rect().center()));
     }
-
     FakeWindowServer server;
-    FakeKeys keys;
-    NoDefaults defaults;
-    ManualMainLoop loop;
-    FakeOwner owner;
-    SMThemeView* view = nullptr;
-    SMMenuListWidget* box = nullptr;
 };
 
 TEST_F(MenuPanel, BlursOnceBelowEveryShowingOrOncePerProcessByTheFilter) {
-    using Log = std::vector<std::string>;
-    auto window = makeWindow();
     window->showMenuWindow();
     window->showMenuWindow();
     EXPECT_EQ(server.log, (Log{"capture", "front", "front"}))
         << "before the panel is there, and never with it";
-    EXPECT_EQ(view->backgroundImage().pixelColor(100, 100), QColor(Qt::red));
+    const auto background = [this] { return dynamic_cast<SMThemeView*>(view)->backgroundImage(); };
+    EXPECT_GT(background().pixelColor(100, 100).red(), 250);
     window->hideMenuWindow();
     window->showMenuWindow();
     EXPECT_EQ(server.log.size(), 5U) << "a fresh picture for every showing";
@@ -105,8 +89,8 @@ TEST_F(MenuPanel, BlursOnceBelowEveryShowingOrOncePerProcessByTheFilter) {
         window->hideMenuWindow();
         window->showMenuWindow();
     }
-    EXPECT_TRUE(view->backgroundImage().isNull());
-    window = makeWindow();
+    EXPECT_TRUE(background().isNull());
+    makeWindow(server);
     window->showMenuWindow();
     EXPECT_EQ(server.log, (Log{"front", "filter", "front", "front"}));
 }
@@ -120,7 +104,6 @@ struct PaintCounter final : QObject {
 };
 
 TEST_F(MenuPanel, SlidesInSevenFramesWithoutHandlingEvents) {
-    const auto window = makeWindow();
     window->showMenuWindow();
     QCoreApplication::processEvents();
     PaintCounter counter;
@@ -142,6 +125,74 @@ TEST_F(MenuPanel, SlidesInSevenFramesWithoutHandlingEvents) {
     EXPECT_EQ(counter.paints, 0) << "reduced motion";
     QCoreApplication::processEvents();
     EXPECT_EQ(box->grab().toImage(), slid);
+}
+
+TEST_F(MenuPanel, PaintsOnlyRowsInViewAndMakesNothingAnewForTheSamePicture) {
+    owner.contents.searchableApps =
+        listTitled(numbered("A title that is far too long for the width ", 10000));
+    window->showMenuWindow();
+    QTest::keyClicks(field, "title");
+    const QImage before = view->grab().toImage();
+    const auto painted = box->paintedRows();
+    const auto made = box->tools().madeAnew();
+    EXPECT_EQ(view->grab().toImage(), before);
+    EXPECT_EQ(box->paintedRows() - painted, visibleTitles(controller().rightMenuCollectionView()).size());
+    EXPECT_LT(box->paintedRows() - painted, 30U);
+    EXPECT_EQ(box->tools().madeAnew(), made);
+}
+
+TEST_F(MenuPanel, TakesKeysThatComeFasterThanItPaints) {
+    window->showMenuWindow();
+    QTest::keyClicks(field, "edi");
+    QTest::keyClick(field, Qt::Key_Return, Qt::AltModifier);
+    EXPECT_EQ(owner.log, (Log{"action Editor", "close"}));
+    QTest::keyClick(field, Qt::Key_Escape);
+    EXPECT_TRUE(field->text().isEmpty());
+}
+
+TEST_F(MenuPanel, TellsOfAMachineOnlyWhenTheUserChoosesIt) {
+    auto* machines = widget<QComboBox>("vmListPopUpButton");
+    owner.contents.selectedIndex = 7;
+    window->reloadData();
+    EXPECT_EQ(machines->currentIndex(), 0) << "out of range changes nothing";
+    EXPECT_TRUE(owner.log.empty());
+    machines->setCurrentIndex(2);
+    Q_EMIT machines->activated(2);
+    EXPECT_EQ(owner.log, Log{"select 2"});
+}
+
+TEST_F(MenuPanel, HasAMenuOfKeyboardShortcuts) {
+    window->showMenuWindow();
+    const auto action = [this](const char* name) { return view->findChild<QAction*>(name); };
+    QTest::keyClicks(field, "web");
+    action("selectAllAction")->trigger();
+    action("cutAction")->trigger();
+    EXPECT_TRUE(field->text().isEmpty());
+    action("pasteAction")->trigger();
+    action("pasteAction")->trigger();
+    EXPECT_EQ(field->text(), "webweb");
+    action("undoAction")->trigger();
+    EXPECT_EQ(field->text(), "web");
+    for (const auto key : {Qt::Key_Comma, Qt::Key_W}) {
+        window->showMenuWindow();
+        QApplication::setActiveWindow(view);
+        QTest::keyClick(field, key, Qt::ControlModifier);
+    }
+    EXPECT_EQ(owner.log, (Log{"settings", "close", "close"}));
+}
+
+TEST_F(MenuPanel, MovesToThePaneOnTheSideOfTheKeyWhereItIsMirrored) {
+    QGuiApplication::setLayoutDirection(Qt::RightToLeft);
+    makeWindow(server);
+    window->showMenuWindow();
+    const auto press = [this](Qt::Key key) {
+        QTest::keyClick(field, key);
+        return controller().currentMouseOverMenuButton()->title();
+    };
+    press(Qt::Key_Down);
+    EXPECT_EQ(press(Qt::Key_Right), "Documents") << "which is on the right now";
+    EXPECT_EQ(press(Qt::Key_Left), "All Programs");
+    QGuiApplication::setLayoutDirection(Qt::LeftToRight);
 }
 
 } // namespace

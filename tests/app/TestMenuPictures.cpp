@@ -1,25 +1,16 @@
 // Holds the menu to pictures that people have looked at: tests/data/menu. With KX_RENEW_PICTURES set it draws
 // them anew instead; look at each before it is kept.
 
-#include "app/SMMenuWindowForm.h"
-#include "app/SMSearchField.h"
-#include "app/menuPainter.h"
-#include "platform/UserDefaults.h"
 #include "platform/linux/QtWindowServer.h"
-#include "tests/app/MenuFixtures.h"
+#include "tests/app/PanelFixtures.h"
 
-#include <QApplication>
 #include <QFontDatabase>
 #include <QPainter>
+#include <QScreen>
 #include <QTest>
 #include <gtest/gtest.h>
 
 namespace {
-
-struct FakeDefaults final : platform::UserDefaults {
-    int variant = 0;
-    int integerForKey(const std::string&) const override { return variant; }
-};
 
 /// Text that comes out alike wherever the font is: the environment names a font configuration of its own.
 void ensureFixedFont() {
@@ -87,7 +78,7 @@ SMMenuModel::List listOf(const std::vector<plist::Value>& infos) {
     return items;
 }
 
-struct MenuPictures : testing::Test {
+struct MenuPictures : testing::Test, PanelWorld {
     void SetUp() override {
         ensureFixedFont();
         auto& menu = owner.contents;
@@ -104,13 +95,14 @@ struct MenuPictures : testing::Test {
         const auto outer = folderInfo("Leisure", {inner, appInfo("Music")});
         menu.allProgramsMenu =
             SMMenuItem::initWithSubmenu(*listOf({appInfo("Editor"), outer, appInfo("Zip")}));
-        window = SMMakeMenuWindow(owner, {server, loop.clock(), loop, keys, defaults});
-        owner.window = window.get();
-        for (QWidget* widget : QApplication::topLevelWidgets())
-            if (widget->objectName() == "menuWindow") view = widget;
+        open();
+    }
+    /// As high on a low screen as on others.
+    void open() {
+        makeWindow(server);
+        window->setFrame({0, 0, 480, 550});
         window->showMenuWindow();
     }
-    SMMenuWindowController& controller() { return dynamic_cast<SMMenuWindowController&>(*window); }
     QImage picture() {
         controller().leftMenuCollectionView().viewWillDraw();
         controller().rightMenuCollectionView().viewWillDraw();
@@ -124,22 +116,36 @@ struct MenuPictures : testing::Test {
     }
 
     platform::QtWindowServer server;
-    FakeKeys keys;
-    FakeDefaults defaults;
-    ManualMainLoop loop;
-    FakeOwner owner;
-    std::unique_ptr<SMMenuWindow> window;
-    QWidget* view = nullptr;
 };
 
-TEST_F(MenuPictures, OfThePanelInItsThreeStatesAndBothPalettes) {
-    QTest::mouseMove(view, QPoint(300, 150));
-    QTest::mouseMove(view, QPoint(300, 151));
-    expectPicture(picture(), "home");
+QString named(const char* name, double scale) {
+    return scale == 1 ? QString(name) : QStringLiteral("%1-%2").arg(name).arg(scale);
+}
+
+/// Once for every scale, and once with screens of two scales.
+TEST_F(MenuPictures, OfThePanelOnEveryScreen) {
+    for (const QScreen* screen : QGuiApplication::screens()) {
+        view->windowHandle()->setScreen(const_cast<QScreen*>(screen));
+        for (const int y : {150, 151})
+            QTest::mouseMove(view, QPoint(300, y));
+        expectPicture(picture(), named("home", screen->devicePixelRatio()));
+    }
+}
+
+TEST_F(MenuPictures, OfThePanelMirrored) {
+    QGuiApplication::setLayoutDirection(Qt::RightToLeft);
+    open();
+    expectPicture(picture(), "mirrored");
+    QGuiApplication::setLayoutDirection(Qt::LeftToRight);
+}
+
+TEST_F(MenuPictures, OfThePanelInItsOtherStatesAndInGraphite) {
+    for (const int y : {150, 151})
+        QTest::mouseMove(view, QPoint(300, y));
     defaults.variant = 6;
     expectPicture(picture(), "graphite");
     defaults.variant = 0;
-    QTest::keyClicks(view->findChild<SMSearchField*>("searchField"), "ma");
+    QTest::keyClicks(field, "ma");
     expectPicture(picture(), "search");
     controller().actionButton()->sendAction();
     controller().actionButton()->sendAction();
@@ -150,11 +156,9 @@ TEST_F(MenuPictures, OfThePanelInItsThreeStatesAndBothPalettes) {
 }
 
 TEST_F(MenuPictures, OfEveryStyleOfRowAtEveryScale) {
-    const std::pair<const char*, double> scales[] = {
-        {"1", 1}, {"1.25", 1.25}, {"1.5", 1.5}, {"2", 2}, {"3", 3}};
     const auto row = listOf({appInfo("Row"), plist::Dictionary{{"separatorItem", true}},
                              folderInfo("Folder", {leafInfo("one")})});
-    for (const auto& [name, scale] : scales) {
+    for (const double scale : {1.0, 1.25, 1.5, 2.0, 3.0}) {
         MenuPainter tools(defaults);
         QImage image((QSizeF(200, 550) * scale).toSize(), QImage::Format_ARGB32_Premultiplied);
         image.setDevicePixelRatio(scale);
@@ -172,7 +176,7 @@ TEST_F(MenuPictures, OfEveryStyleOfRowAtEveryScale) {
                 painter.translate(0, static_cast<double>(height) + 3);
             }
         painter.end();
-        expectPicture(image, QStringLiteral("rows-%1").arg(QLatin1String(name)));
+        expectPicture(image, named("rows", scale));
     }
 }
 

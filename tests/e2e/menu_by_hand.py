@@ -1,5 +1,5 @@
 #!/usr/bin/env python3
-"""The open menu under real hands: the keyboard alone, keys and clicks during a slide, and another window.
+"""The open menu under real hands: the keyboard alone, wheel and Alt, clicks during a slide, another window.
 
 Started by tools/with-display, with KX_TEST_BIN naming the programs' folder."""
 
@@ -113,6 +113,27 @@ class MenuByHand(unittest.TestCase):
         self.assertIn("Program26", self.chosen(lambda: press("Return")), "the search survives a short closing")
         self.setUp()
         press("Escape")
+
+    def test_the_wheel_scrolls_the_applications_from_either_pane(self):
+        x, y, _, _ = PANEL.frame()
+        first_row = y + ACTION_BUTTON + 54  # below the arrow
+        for place, wheel, program in ((80, "5", "03"), (LEFT_PANE + 60, "5", "03"), (80, "55554", "07")):
+            self.search("program")
+            point(x + place, y + 300)
+            run("xdotool", *(word for button in wheel for word in ("click", button)))
+            self.assertIn("Program" + program, self.chosen(lambda: click(x + LEFT_PANE + 60, first_row)))
+            self.setUp()
+            press("Escape")
+
+    def test_alt_shows_alternates_while_it_is_held(self):
+        item = {"title": "Plain", "altMenuItem": {"title": "Something else"}}
+        self.changes("the item", lambda: self.peer.send(self.agent_port, "menu.update", {"menu": {"pinnedApps": [item]}}))
+        plain = self.right_pane()
+        try:
+            self.changes("the alternate", lambda: run("xdotool", "keydown", "Alt_L"))
+        finally:
+            run("xdotool", "keyup", "Alt_L")
+        wait_until("the item again", lambda: self.right_pane() == plain)
 
     def test_another_window_takes_the_keyboard_and_closes_it(self):
         other = subprocess.Popen(["xmessage", "-geometry", "200x100+100+600", "another window"])

@@ -46,6 +46,15 @@ TEST(PanelPlacement, MovesThePanelOnlyFromWhereThereIsNoRoom) {
     EXPECT_EQ(PlacePanel(nowhere, {}, {0, 0, 1280, 776}, true), (KXRect{0, 276, 480, 500}));
 }
 
+TEST(PanelPlacement, LeavesAnItemWithoutABarItsRoom) {
+    const KXRect screen{0, 0, 640, 400};
+    EXPECT_EQ(platform::RoomAtItem({610, 378, 30, 22}, screen), (KXRect{0, 0, 640, 378}));
+    EXPECT_EQ(platform::RoomAtItem({610, 0, 30, 22}, screen), (KXRect{0, 22, 640, 378}));
+    EXPECT_EQ(platform::RoomAtItem({610, 400, 30, 22}, screen), screen) << "in a bar above";
+    EXPECT_EQ(platform::RoomAtItem({-30, 300, 30, 22}, screen), screen) << "in one at the side";
+    EXPECT_EQ(platform::RoomAtItem({}, screen), screen);
+}
+
 TEST(PanelPlacement, GuessesTheItemsFrameFromItsClick) {
     const KXRect screen{0, 0, 1280, 800};
     const KXSize size{30, 22};

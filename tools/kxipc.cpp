@@ -1,8 +1,10 @@
 #include "lib/base/Log.h"
 #include "lib/ipc/KXIPCContext.h"
 #include "lib/ipc/KXIPCNames.h"
+#include "platform/PortWatch.h"
 #include "platform/linux/LinuxPorts.h"
 #include "platform/linux/PollMainLoop.h"
+#include "platform/linux/PrivateDirectory.h"
 #include "platform/linux/ProcProcessTable.h"
 #include "platform/linux/SystemClock.h"
 #include "platform/linux/TerminationSignals.h"
@@ -13,8 +15,11 @@
 #include "tools/kxipcWatch.h"
 
 #include <algorithm>
+#include <cstddef>
 #include <fstream>
 #include <iostream>
+#include <string>
+#include <utility>
 
 namespace {
 

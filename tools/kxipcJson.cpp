@@ -1,9 +1,12 @@
 #include "tools/kxipcJson.h"
 
 #include "lib/plist/JSON.h"
+#include "lib/plist/Value.h"
 
 #include <charconv>
 #include <cmath>
+#include <cstddef>
+#include <string>
 
 namespace {
 

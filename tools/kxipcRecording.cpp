@@ -1,12 +1,26 @@
 #include "tools/kxipcRecording.h"
 
+#include "lib/ipc/KXIPCContext.h"
+#include "lib/ipc/KXIPCMessage.h"
 #include "lib/ipc/KXIPCNames.h"
 #include "lib/ipc/KXIPCSend.h"
+#include "lib/kxAppKit/system/KXProcess.h"
 #include "lib/plist/Binary.h"
+#include "lib/plist/Value.h"
+#include "platform/PortWatch.h"
 
 #include <algorithm>
+#include <chrono>
+#include <cstddef>
+#include <cstdint>
+#include <functional>
+#include <ios>
 #include <istream>
+#include <optional>
 #include <ostream>
+#include <string>
+#include <utility>
+#include <vector>
 
 namespace {
 

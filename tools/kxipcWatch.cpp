@@ -1,10 +1,17 @@
 #include "tools/kxipcWatch.h"
 
 #include "lib/plist/Binary.h"
+#include "lib/plist/Value.h"
+#include "platform/Clock.h"
+#include "platform/PortWatch.h"
 #include "tools/kxipcJson.h"
 
+#include <chrono>
 #include <cstdio>
+#include <functional>
 #include <ostream>
+#include <string>
+#include <utility>
 
 namespace {
 

@@ -1,6 +1,11 @@
 #include "lib/raster/avx512.h"
+#include "lib/raster/pixel.h"
+#include "lib/raster/rowops.h"
 
+#include <algorithm>
 #include <bit>
+#include <cstddef>
+#include <cstdint>
 
 namespace raster::avx512 {
 
@@ -209,13 +214,14 @@ KX_AVX512 inline Sums boxSums(const std::uint8_t* from, Vector positions, std::u
     const auto wholes = std::min<std::uint32_t>(step >> 16, BoxRun::maximum);
     std::uint32_t tap = 1;
     for (; tap < wholes; ++tap)
-        sums.addWhole(_mm512_mask_i32gather_epi32(zero, active, index, from + tap * 4, 4));
+        sums.addWhole(_mm512_mask_i32gather_epi32(zero, active, index, from + std::size_t{tap} * 4, 4));
     Vector remaining =
         _mm512_sub_epi32(_mm512_set1_epi32(static_cast<int>(step - (tap - 1) * 0x10000)), first);
     for (; tap < BoxRun::maximum; ++tap) {
         active = _mm512_mask_test_epi32_mask(active, remaining, remaining);
         if (active == 0) break;
-        sums.add(_mm512_mask_i32gather_epi32(zero, active, index, from + tap * 4, 4), weightWords(remaining));
+        sums.add(_mm512_mask_i32gather_epi32(zero, active, index, from + std::size_t{tap} * 4, 4),
+                 weightWords(remaining));
         remaining = _mm512_sub_epi32(_mm512_max_epu32(remaining, whole), whole);
     }
     return sums;

@@ -1,5 +1,7 @@
 #include "platform/linux/Backlog.h"
 
+#include <cstddef>
+#include <mutex>
 #include <utility>
 
 namespace platform {
@@ -41,7 +43,7 @@ void Backlog::add(int sender, std::size_t bytes) {
 }
 
 void Backlog::remove(int sender, std::size_t bytes) {
-    bool isRoom;
+    bool isRoom = false;
     {
         const std::lock_guard lock(m_mutex);
         const auto found = m_senders.find(sender);

@@ -1,10 +1,19 @@
 #include "platform/linux/FollowingStatusBar.h"
+#include "lib/base/Geometry.h"
+#include "platform/MainLoop.h"
+#include "platform/StatusBar.h"
+#include "platform/linux/HostedStatusBar.h"
 
 #include <algorithm>
 #include <chrono>
+#include <cstddef>
+#include <cstdint>
 #include <iterator>
+#include <memory>
 #include <optional>
+#include <span>
 #include <utility>
+#include <vector>
 
 namespace platform {
 

@@ -1,10 +1,15 @@
 #include "platform/linux/LinuxSystem.h"
 
+#include "platform/DistributedNotificationCenter.h"
+#include "platform/MainLoop.h"
+#include "platform/MessagePort.h"
+#include "platform/ProcessTable.h"
 #include "platform/linux/LinuxPorts.h"
 #include "platform/linux/PollMainLoop.h"
 #include "platform/linux/ProcProcessTable.h"
 #include "platform/linux/SystemClock.h"
 #include "platform/linux/TerminationSignals.h"
+#include <memory>
 
 namespace platform {
 

@@ -2,6 +2,7 @@
 
 #include <QDBusMetaType>
 #include <QtEndian>
+#include <functional>
 #include <utility>
 
 namespace platform {

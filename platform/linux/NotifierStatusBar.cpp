@@ -1,6 +1,9 @@
 #include "platform/linux/NotifierStatusBar.h"
 
+#include "lib/base/Geometry.h"
 #include "lib/base/Log.h"
+#include "platform/StatusBar.h"
+#include "platform/linux/NotifierHost.h"
 #include "platform/linux/NotifierItem.h"
 #include "platform/linux/PanelPlacement.h"
 #include "platform/linux/QtScreenCoordinates.h"
@@ -12,7 +15,9 @@
 #include <QDBusPendingCallWatcher>
 #include <QDBusPendingReply>
 #include <QPainter>
+#include <memory>
 #include <optional>
+#include <utility>
 
 namespace platform {
 

@@ -1,15 +1,22 @@
 #include "platform/linux/PortLeftovers.h"
 
+#include "platform/ProcessTable.h"
 #include "platform/linux/Descriptor.h"
 #include "platform/linux/PeerIdentity.h"
 
+#include <cstdint>
 #include <dirent.h>
 #include <fcntl.h>
+#include <optional>
+#include <string>
 #include <sys/file.h>
 
 #include <charconv>
 #include <memory>
 #include <string_view>
+#include <system_error>
+#include <unistd.h>
+#include <vector>
 
 namespace platform {
 

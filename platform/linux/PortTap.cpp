@@ -1,7 +1,18 @@
 #include "platform/linux/PortTap.h"
 
 #include "lib/plist/Binary.h"
+#include "lib/plist/Value.h"
 #include "platform/linux/IncomingConnection.h"
+#include "platform/linux/PortPacket.h"
+#include <cstddef>
+#include <cstdint>
+#include <memory>
+#include <mutex>
+#include <span>
+#include <string>
+#include <sys/socket.h>
+#include <unistd.h>
+#include <vector>
 
 namespace platform {
 

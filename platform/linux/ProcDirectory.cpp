@@ -7,6 +7,7 @@
 #include <algorithm>
 #include <array>
 #include <cstddef>
+#include <cstdint>
 #include <dirent.h>
 #include <fcntl.h>
 #include <linux/limits.h>

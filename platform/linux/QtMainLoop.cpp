@@ -6,7 +6,6 @@
 #include <QSocketNotifier>
 #include <QTimer>
 #include <memory>
-#include <sys/eventfd.h>
 #include <utility>
 
 namespace platform {

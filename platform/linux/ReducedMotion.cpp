@@ -5,7 +5,12 @@
 #include <QSettings>
 #include <QStandardPaths>
 #include <bit>
+#include <cstddef>
 #include <cstdint>
+#include <optional>
+#include <span>
+#include <string_view>
+#include <xcb/xproto.h>
 
 namespace platform {
 

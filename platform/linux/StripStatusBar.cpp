@@ -11,6 +11,7 @@
 #include <QStyle>
 #include <QWidget>
 #include <memory>
+#include <vector>
 
 namespace platform {
 

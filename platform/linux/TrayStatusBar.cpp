@@ -1,12 +1,16 @@
 #include "platform/linux/TrayStatusBar.h"
 
-#include "platform/linux/PanelPlacement.h"
+#include "lib/base/Geometry.h"
+#include "platform/MainLoop.h"
+#include "platform/StatusBar.h"
 #include "platform/linux/QtScreenCoordinates.h"
 #include "platform/linux/StatusItemWidget.h"
 #include "platform/linux/XcbTray.h"
 
 #include <QPainter>
 #include <chrono>
+#include <cstdint>
+#include <memory>
 
 namespace platform {
 

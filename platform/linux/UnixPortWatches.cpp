@@ -1,6 +1,13 @@
 #include "platform/linux/UnixPortWatches.h"
 
+#include "platform/MainLoop.h"
+#include "platform/PortWatch.h"
+#include "platform/linux/Descriptor.h"
 #include "platform/linux/PortPacket.h"
+#include <cstdint>
+#include <memory>
+#include <string>
+#include <utility>
 
 namespace platform {
 

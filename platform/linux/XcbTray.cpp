@@ -1,8 +1,13 @@
 #include "platform/linux/XcbTray.h"
 
+#include "lib/base/Geometry.h"
 #include "platform/linux/XcbConnection.h"
 
+#include <cstdint>
 #include <cstring>
+#include <optional>
+#include <xcb/xcb.h>
+#include <xcb/xproto.h>
 
 namespace platform {
 

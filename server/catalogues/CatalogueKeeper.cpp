@@ -43,18 +43,19 @@ CatalogueKeeper::CatalogueKeeper(Machine& machine, Executor execute, std::functi
 
 void CatalogueKeeper::refresh() {
     if (m_reading) return;
-    if (m_stale) {
-        m_reading = true;
-        m_stale = false;
-        m_execute([this, &machine = m_machine] {
-            return [this, read = machine.readCatalogue()]() mutable { onCatalogue(std::move(read)); };
-        });
-        return;
-    }
+    if (m_stale) return readCatalogue();
     if (m_looksLeft == 0) return;
     --m_looksLeft;
     m_reading = true;
     readIcons(missingIcons(), true);
+}
+
+void CatalogueKeeper::readCatalogue() {
+    m_reading = true;
+    m_stale = false;
+    m_execute([this, &machine = m_machine] {
+        return [this, read = machine.readCatalogue()]() mutable { onCatalogue(std::move(read)); };
+    });
 }
 
 void CatalogueKeeper::onCatalogue(std::optional<Catalogue> read) {

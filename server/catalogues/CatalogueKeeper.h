@@ -37,6 +37,7 @@ private:
         CatalogueIndex index;
     };
 
+    void readCatalogue();
     void onCatalogue(std::optional<Catalogue> read);
     void readIcons(const std::set<std::string>& names, bool keepOthers);
     void onIcons(IconSets read, bool keepOthers);

@@ -74,7 +74,7 @@ TEST(Log, RotationShiftsByOneForgetsTheOldestAndKeepsGaps) {
 
 TEST(Log, OfAProgramThatStartsOftenRotatesWhenItIsLarge) {
     const ScratchHome home;
-    for (const std::size_t size : {1000, 1 << 20}) {
+    for (const std::size_t size : {1000U, 1U << 20}) {
         EXPECT_FALSE(fs::exists(LogFilePath(1)));
         put(LogFilePath(0), std::string(size, 'x'));
         RotateLargeLogFile();

@@ -131,14 +131,14 @@ TEST(RowOps, EveryInstructionSetGivesTheSameBytes) {
             case 8: {
                 const bool whole = seed % 3 == 0;
                 const auto step = static_cast<std::uint32_t>(
-                    whole ? 0x20000 << random() % 3 : 0x10001 + random() % (flag ? 0x40000 : 0x400000));
+                    whole ? 0x20000U << random() % 3 : 0x10001 + random() % (flag ? 0x40000 : 0x400000));
                 const auto start =
                     static_cast<std::int64_t>(random() % 8 << 16 | (whole ? 0 : random() & 0xFFFF));
                 return ops.sampleBox(to, source, {start, step, static_cast<int>(1 + random() % 80)}, count);
             }
             default: {
                 const auto step = static_cast<std::uint32_t>(
-                    seed % 3 == 0 ? 0x20000 << random() % 6
+                    seed % 3 == 0 ? 0x20000U << random() % 6
                                   : 0x10001 + random() % (flag ? 0x40000 : 0x400000));
                 const BoxRun run = boxRun(static_cast<std::int64_t>(random() % 0x10000), step);
                 const std::uint8_t* rows[BoxRun::maximum];

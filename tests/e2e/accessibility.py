@@ -137,7 +137,13 @@ class Accessibility(unittest.TestCase):
         self.await_event("the count", lambda kind, source: "accessible-description" in kind and source == self.field)
         results = self.menu_list("Applications")
         wait_until("the rows", lambda: results.clear_cache() or results.get_child_count() >= APPLICATIONS)
-        found = rows(results)
+
+        def read_all():
+            """None when an update came in the middle: then some row was between the old list and the new."""
+            found = rows(results)
+            return found if len(found) == APPLICATIONS else None
+
+        found = wait_until("every row", read_all)
         names = [row.get_name() for row in found]
         self.assertEqual(sorted(names), [f"Testing {number:05}" for number in range(APPLICATIONS)])
         self.assertFalse(has(found[-1], Atspi.StateType.SHOWING))

@@ -9,48 +9,48 @@
 #include <string>
 #include <vector>
 
+using Titles = std::vector<std::string>;
+
 struct FakeKeys final : platform::ModifierKeys {
     bool option = false;
     bool isOptionDown() const override { return option; }
 };
 
-inline SMMenuItem::Pointer itemTitled(const std::string& title, plist::Dictionary extra = {}) {
-    return SMMenuItem::initWithDictionary(extra.set("title", title));
+/// What makes a leaf; `extra` may give it any other key.
+inline plist::Value leafInfo(const std::string& title, plist::Dictionary extra = {}) {
+    return extra.set("title", title);
 }
-
-/// A folder over leaves of these titles.
 inline plist::Value folderInfo(const std::string& title, const std::vector<plist::Value>& children) {
-    return plist::Dictionary{{"title", title}, {"submenuInfoArray", plist::Array(children)}};
+    return leafInfo(title, {{"submenuInfoArray", plist::Array(children)}});
 }
-inline plist::Value leafInfo(const std::string& title) {
-    return plist::Dictionary{{"title", title}};
+inline SMMenuItem::Pointer itemTitled(const std::string& title, plist::Dictionary extra = {}) {
+    return SMMenuItem::initWithDictionary(leafInfo(title, std::move(extra)));
 }
-
-inline SMMenuItems itemsTitled(const std::vector<std::string>& titles) {
-    SMMenuItems items;
+inline SMMenuModel::List listOf(const std::vector<plist::Value>& infos) {
+    return SMMenuItem::initWithDictionary(folderInfo("", infos))->submenu();
+}
+inline SMMenuModel::List listTitled(const Titles& titles) {
+    std::vector<plist::Value> infos;
     for (const auto& title : titles)
-        items.push_back(title == "|" ? SMMenuItem::separatorItem() : itemTitled(title));
-    return items;
+        infos.push_back(leafInfo(title));
+    return listOf(infos);
 }
-inline SMMenuModel::List listTitled(const std::vector<std::string>& titles) {
-    return std::make_shared<const SMMenuItems>(itemsTitled(titles));
-}
-inline std::vector<std::string> numbered(const std::string& stem, int count) {
-    std::vector<std::string> titles;
+inline Titles numbered(const std::string& stem, int count) {
+    Titles titles;
     for (int i = 0; i < count; ++i)
         titles.push_back(stem + std::to_string(i));
     return titles;
 }
 
-inline std::vector<std::string> titlesOf(const SMMenuItems& items) {
-    std::vector<std::string> titles;
+inline Titles titlesOf(const SMMenuItems& items) {
+    Titles titles;
     for (const auto& item : items)
         titles.push_back(item->isSeparator() ? "|" : item->title());
     return titles;
 }
 /// The rows in view, from the top down: "^" and "v" for the arrows, "|" for separators.
-inline std::vector<std::string> visibleTitles(const SMMenuCollectionView& list) {
-    std::vector<std::string> titles;
+inline Titles visibleTitles(const SMMenuCollectionView& list) {
+    Titles titles;
     list.forEachVisibleButton([&](const SMMenuButton& button) {
         const bool up = button.style() == SMMenuButtonStyleScrollUp;
         const bool separator = button.menuItem() && button.menuItem()->isSeparator();
@@ -68,7 +68,7 @@ struct FakeOutlets final : SMMenuWindowOutlets {
     SMMenuCollectionView* left = nullptr;
     SMMenuCollectionView* right = nullptr;
     std::vector<std::int32_t> animations;
-    std::vector<std::string> machines;
+    Titles machines;
     std::int32_t selectedMachine = -1;
     std::string search;
     std::optional<std::size_t> results;
@@ -85,9 +85,7 @@ struct FakeOutlets final : SMMenuWindowOutlets {
     KXRect visibleScreenFrame() const override { return screen; }
     void makeKeyAndOrderFront() override { visible = true; }
     void orderOut() override {
-        const bool wasVisible = visible;
-        visible = false;
-        if (wasVisible && events) events->windowDidResignKey();
+        if (std::exchange(visible, false)) events->windowDidResignKey();
     }
     void setNeedsDisplay() override {}
     KXRect areaFrame(SMMenuArea area) const override {
@@ -103,13 +101,13 @@ struct FakeOutlets final : SMMenuWindowOutlets {
     void setButton(SMMenuArea, SMMenuButton*) override {}
     void setLeftList(SMMenuCollectionView* list) override {
         left = list;
-        if (left) left->setSize(areaFrame(SMMenuArea::leftMenu).size());
+        setFrame(windowFrame);
     }
     void setRightList(SMMenuCollectionView* list, std::int32_t animation) override {
         right = list;
         animations.push_back(animation);
     }
-    void setVMList(const std::vector<std::string>& names) override {
+    void setVMList(const Titles& names) override {
         machines = names;
         selectedMachine = names.empty() ? -1 : 0;
     }
@@ -124,7 +122,7 @@ struct FakeOutlets final : SMMenuWindowOutlets {
 struct FakeOwner final : SMMenuWindowOwner {
     SMMenuModel contents;
     SMMenuWindow* window = nullptr;
-    std::vector<std::string> log;
+    Titles log;
     const SMMenuModel& model() const override { return contents; }
     void performMenuItemAction(const SMMenuItem& item) override { log.push_back("action " + item.title()); }
     void showMenuSettings() override { log.push_back("settings"); }
@@ -192,5 +190,5 @@ struct MenuWorld {
         const auto& button = menu->currentMouseOverMenuButton();
         return button ? button->title() : "none";
     }
-    std::vector<std::string> rightTitles() const { return titlesOf(outlets->right->menuItems()); }
+    Titles rightTitles() const { return titlesOf(outlets->right->menuItems()); }
 };

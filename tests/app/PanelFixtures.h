@@ -4,17 +4,10 @@
 #include "app/SMMenuWindowForm.h"
 #include "app/SMSearchField.h"
 #include "app/menuPainter.h"
-#include "platform/UserDefaults.h"
 #include "tests/app/MenuFixtures.h"
+#include "tests/support/InMemoryDesktop.h"
 
 #include <QApplication>
-
-struct FakeDefaults final : platform::UserDefaults {
-    int variant = 0;
-    int integerForKey(const std::string& key) const override {
-        return key == "AppleAquaColorVariant" ? variant : 0;
-    }
-};
 
 /// The real window and controller, on a display that shows nothing.
 struct PanelWorld {
@@ -35,7 +28,7 @@ struct PanelWorld {
     SMMenuWindowController& controller() const { return dynamic_cast<SMMenuWindowController&>(*window); }
 
     FakeKeys keys;
-    FakeDefaults defaults;
+    InMemoryDesktop::Defaults defaults;
     ManualMainLoop loop;
     FakeOwner owner;
     std::unique_ptr<SMMenuWindow> window;

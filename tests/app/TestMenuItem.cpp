@@ -61,14 +61,9 @@ TEST(MenuItem, CountsWrongTypesAsAbsent) {
 }
 
 TEST(MenuItem, GivesBackARepresentedObjectOfAnyTypeWithoutHoldingTheMessage) {
-    const Value tokens[] = {7,
-                            0.5,
-                            true,
-                            plist::Date{12.5},
-                            "ключ",
-                            plist::Data::copyOf("abc", 3),
-                            Array{1, Array{"x"}, Dictionary{{"k", false}}}};
-    for (const auto& token : tokens) {
+    const Array mixed{0.5, Array{"x"}, Dictionary{{"k", false}}, plist::Data::copyOf("abc", 3)};
+    for (const Value& token :
+         {Value(7), Value(true), Value("ключ"), Value(plist::Date{12.5}), Value(mixed)}) {
         std::weak_ptr<const void> message;
         const auto item = SMMenuItem::initWithDictionary(
             received(Dictionary{{"representedObject", token}, {"title", "x"}}, &message));
@@ -116,17 +111,6 @@ TEST(MenuItem, MakesItsIconOnceFromTheFirstSourceThatItHas) {
     EXPECT_TRUE(broken->icon()->isFlipped()) << "the raw icons are dropped, and the type is next";
     EXPECT_EQ(broken->icon(), broken->icon());
     EXPECT_EQ(icons.asked, "pdf ");
-}
-
-TEST(MenuItem, ComparesTitlesWithoutCase) {
-    const auto titled = [](const char* text) {
-        const auto item = std::make_shared<SMMenuItem>();
-        item->setTitle(text);
-        return item;
-    };
-    EXPECT_EQ(titled("ÄPFEL")->titleCompare(*titled("äpfel")), 0);
-    EXPECT_LT(titled("alpha")->titleCompare(*titled("Beta")), 0);
-    EXPECT_GT(titled("Zulu")->titleCompare(*titled("alpha")), 0);
 }
 
 } // namespace

@@ -12,10 +12,9 @@ struct List {
     std::vector<MenuListRow> rows;
     MenuListState state;
 
-    List(std::size_t count, float height, std::size_t scrollIndex = 0)
+    List(std::size_t count, float height)
         : rows(count, MenuListRow{20, false}) {
         state.height = height;
-        state.scrollIndex = scrollIndex;
     }
     MenuListLayout layout() const { return layoutMenuList(rows, state); }
 };
@@ -31,13 +30,9 @@ TEST(MenuListLayout, ReplacesTheLastRowThatFitsByAnArrow) {
 }
 
 TEST(MenuListLayout, GivesSpareHeightToFlexibleRows) {
-    List list(4, 200);
-    list.rows[1].flexible = true;
-    EXPECT_EQ(list.layout().places[1].height, 140) << "spare 120 and the last row's 20";
-    EXPECT_EQ(list.layout().places[3].y, 0);
-    list.rows[2].flexible = true;
-    list.rows.back().height = 16;
-    list.state.height = 201;
+    List list(4, 201);
+    list.rows[1].flexible = list.rows[2].flexible = true;
+    list.rows[3].height = 16;
     EXPECT_EQ(list.layout().places[1].height, 70) << "(125 + 16) / 2, rounded down";
     list.state.height = 76;
     EXPECT_EQ(list.layout().places[1].height, 0) << "nothing to spare";
@@ -96,14 +91,14 @@ TEST(MenuListLayout, FindsTheScrollIndexThatSteppingWouldReach) {
         if (list.rows.empty() || list.state.disallowScrolling) continue;
         const std::size_t target = random() % list.rows.size();
         List stepped = list;
-        auto& index = stepped.state.scrollIndex;
-        for (auto next = scrollIndexUp(stepped.state); next && isHidden(stepped, target);
-             next = scrollIndexUp(stepped.state))
-            index = *next;
-        for (auto next = scrollIndexDown(stepped.rows, stepped.state); next && isHidden(stepped, target);
-             next = scrollIndexDown(stepped.rows, stepped.state))
-            index = *next;
-        ASSERT_EQ(scrollIndexShowing(list.rows, list.state, target), index) << round;
+        for (const bool up : {true, false})
+            while (isHidden(stepped, target)) {
+                const auto next =
+                    up ? scrollIndexUp(stepped.state) : scrollIndexDown(stepped.rows, stepped.state);
+                if (!next) break;
+                stepped.state.scrollIndex = *next;
+            }
+        ASSERT_EQ(scrollIndexShowing(list.rows, list.state, target), stepped.state.scrollIndex) << round;
     }
 }
 

@@ -3,6 +3,7 @@
 
 #include "platform/linux/QtWindowServer.h"
 #include "tests/app/PanelFixtures.h"
+#include "tests/support/GuiApplication.h"
 
 #include <QFontDatabase>
 #include <QPainter>
@@ -14,10 +15,7 @@ namespace {
 
 /// Text that comes out alike wherever the font is: the environment names a font configuration of its own.
 void ensureFixedFont() {
-    static int count = 1;
-    static char name[] = "test";
-    static char* arguments[] = {name, nullptr};
-    static auto* application = new QApplication(count, arguments);
+    ensureGuiApplication().setCursorFlashTime(0);
     const int id = QFontDatabase::addApplicationFont("/usr/share/fonts/truetype/dejavu/DejaVuSans.ttf");
     ASSERT_GE(id, 0);
     QFont font(QFontDatabase::applicationFontFamilies(id).constFirst());
@@ -25,11 +23,11 @@ void ensureFixedFont() {
     font.setHintingPreference(QFont::PreferNoHinting);
     font.setStyleStrategy(QFont::NoSubpixelAntialias);
     QApplication::setFont(font);
-    application->setCursorFlashTime(0);
 }
 
 /// At most one pixel in a thousand may differ by more than 2 in a channel.
-void expectPicture(const QImage& drawn, const QString& name) {
+void expectPicture(const QImage& drawn, const char* stem, double scale = 1) {
+    const QString name = scale == 1 ? QString(stem) : QStringLiteral("%1-%2").arg(stem).arg(scale);
     const QString path = QStringLiteral(KX_PICTURES "/") + name + ".png";
     const QImage picture = drawn.convertToFormat(QImage::Format_RGB32);
     if (qEnvironmentVariableIsSet("KX_RENEW_PICTURES")) {
@@ -38,44 +36,30 @@ void expectPicture(const QImage& drawn, const QString& name) {
     }
     const QImage golden = QImage(path).convertToFormat(QImage::Format_RGB32);
     ASSERT_EQ(golden.size(), picture.size()) << name.toStdString();
+    const int pixels = golden.width() * golden.height();
     int different = 0;
-    for (int y = 0; y < golden.height(); ++y)
-        for (int x = 0; x < golden.width(); ++x) {
-            const QRgb a = golden.pixel(x, y), b = picture.pixel(x, y);
-            const int distance = std::max({std::abs(qRed(a) - qRed(b)), std::abs(qGreen(a) - qGreen(b)),
-                                           std::abs(qBlue(a) - qBlue(b))});
-            different += distance > 2;
-        }
-    const bool alike = different * 1000 <= golden.width() * golden.height();
+    for (int i = 0; i < pixels; ++i) {
+        const QColor a = golden.pixelColor(i % golden.width(), i / golden.width());
+        const QColor b = picture.pixelColor(i % golden.width(), i / golden.width());
+        different += std::max({std::abs(a.red() - b.red()), std::abs(a.green() - b.green()),
+                               std::abs(a.blue() - b.blue())}) > 2;
+    }
+    const bool alike = different * 1000 <= pixels;
     EXPECT_TRUE(alike) << name.toStdString() << ": " << different << " pixels differ";
     if (!alike) picture.save(name + "-drawn.png");
 }
 
 /// A frame round a colour, so that a lost row or column shows.
-plist::Value iconInfo(int side, std::uint8_t hue) {
-    std::vector<std::uint8_t> pixels;
-    for (int y = 0; y < side; ++y)
-        for (int x = 0; x < side; ++x) {
-            const bool edge = x == 0 || y == 0 || x == side - 1 || y == side - 1;
-            const std::uint8_t grey = edge ? 0 : hue;
-            pixels.insert(pixels.end(), {grey, static_cast<std::uint8_t>(edge ? 0 : 255 - hue),
-                                         std::uint8_t{128}, std::uint8_t{255}});
-        }
-    return plist::Dictionary{{"format", "bgra"},
-                             {"width", side},
-                             {"height", side},
-                             {"data", plist::Data::copyOf(pixels.data(), pixels.size())}};
+plist::Value iconInfo(int side, int hue) {
+    QImage icon(side, side, QImage::Format_ARGB32);
+    icon.fill(QColor(128, 0, 0));
+    QPainter(&icon).fillRect(1, 1, side - 2, side - 2, QColor(128, 255 - hue, hue));
+    const auto pixels = plist::Data::copyOf(icon.constBits(), static_cast<std::size_t>(icon.sizeInBytes()));
+    return plist::Dictionary{{"format", "bgra"}, {"width", side}, {"height", side}, {"data", pixels}};
 }
 plist::Value appInfo(const std::string& title, plist::Dictionary extra = {}) {
-    const auto hue = static_cast<std::uint8_t>(title.size() * 16);
+    const auto hue = static_cast<int>(title.size() * 16 % 256);
     return extra.set("title", title).set("rawIcons", plist::Array{iconInfo(16, hue), iconInfo(32, hue)});
-}
-
-SMMenuModel::List listOf(const std::vector<plist::Value>& infos) {
-    auto items = std::make_shared<SMMenuItems>();
-    for (const auto& info : infos)
-        items->push_back(SMMenuItem::initWithDictionary(info));
-    return items;
 }
 
 struct MenuPictures : testing::Test, PanelWorld {
@@ -83,9 +67,9 @@ struct MenuPictures : testing::Test, PanelWorld {
         ensureFixedFont();
         auto& menu = owner.contents;
         menu.nameList = {"Windows, the machine with quite a long name"};
-        menu.topMenu = listOf({leafInfo("Documents"), plist::Dictionary{{"separatorItem", true}},
+        menu.topMenu = listOf({leafInfo("Documents"), leafInfo("", {{"separatorItem", true}}),
                                folderInfo("Recent", {leafInfo("one")})});
-        menu.bottomMenu = listOf({plist::Dictionary{{"title", "Run…"}, {"enabled", false}}});
+        menu.bottomMenu = listOf({leafInfo("Run…", {{"enabled", false}})});
         menu.pinnedApps = listOf({appInfo("Mail"), appInfo("Веб-обозреватель"), appInfo("بريد")});
         menu.frequentlyUsedApps =
             listOf({appInfo("An application whose title is much too long for its row in the list")});
@@ -108,19 +92,9 @@ struct MenuPictures : testing::Test, PanelWorld {
         controller().rightMenuCollectionView().viewWillDraw();
         return view->grab().toImage();
     }
-    void choose(const SMMenuItem& folder) {
-        auto& list = controller().rightMenuCollectionView();
-        list.performLayout();
-        list.findButtonForMenuItem(&folder)->sendAction();
-        list.performLayout();
-    }
 
     platform::QtWindowServer server;
 };
-
-QString named(const char* name, double scale) {
-    return scale == 1 ? QString(name) : QStringLiteral("%1-%2").arg(name).arg(scale);
-}
 
 /// Once for every scale, and once with screens of two scales.
 TEST_F(MenuPictures, OfThePanelOnEveryScreen) {
@@ -128,7 +102,7 @@ TEST_F(MenuPictures, OfThePanelOnEveryScreen) {
         view->windowHandle()->setScreen(const_cast<QScreen*>(screen));
         for (const int y : {150, 151})
             QTest::mouseMove(view, QPoint(300, y));
-        expectPicture(picture(), named("home", screen->devicePixelRatio()));
+        expectPicture(picture(), "home", screen->devicePixelRatio());
     }
 }
 
@@ -142,16 +116,15 @@ TEST_F(MenuPictures, OfThePanelMirrored) {
 TEST_F(MenuPictures, OfThePanelInItsOtherStatesAndInGraphite) {
     for (const int y : {150, 151})
         QTest::mouseMove(view, QPoint(300, y));
-    defaults.variant = 6;
+    defaults.values["AppleAquaColorVariant"] = 6;
     expectPicture(picture(), "graphite");
-    defaults.variant = 0;
+    defaults.values.clear();
     QTest::keyClicks(field, "ma");
     expectPicture(picture(), "search");
     controller().actionButton()->sendAction();
     controller().actionButton()->sendAction();
-    const auto outer = (*owner.contents.allProgramsMenu->submenu())[1];
-    choose(*outer);
-    choose(*(*outer->submenu())[0]);
+    const auto outer = owner.contents.allProgramsMenu->submenu()->at(1);
+    controller().rightMenuCollectionView().setExpandedMenuItem(outer->submenu()->at(0));
     expectPicture(picture(), "folder");
 }
 
@@ -176,7 +149,7 @@ TEST_F(MenuPictures, OfEveryStyleOfRowAtEveryScale) {
                 painter.translate(0, static_cast<double>(height) + 3);
             }
         painter.end();
-        expectPicture(image, named("rows", scale));
+        expectPicture(image, "rows", scale);
     }
 }
 

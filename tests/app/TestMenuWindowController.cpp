@@ -4,29 +4,24 @@
 
 namespace {
 
-using Titles = std::vector<std::string>;
 using std::chrono::milliseconds;
 
 struct MenuWindowController : testing::Test, MenuWorld {
     MenuWindowController() {
-        owner.contents.topMenu = std::make_shared<SMMenuItems>(SMMenuItems{
-            itemTitled("Documents"),
-            SMMenuItem::initWithDictionary(folderInfo("Computer", {leafInfo("Disk C")})),
-        });
+        owner.contents.topMenu =
+            listOf({leafInfo("Documents"), folderInfo("Computer", {leafInfo("Disk C")})});
         owner.contents.bottomMenu = listTitled({"Run"});
         owner.contents.pinnedApps = listTitled({"Mail"});
         owner.contents.frequentlyUsedApps = listTitled({"Paint", "Chess"});
         owner.contents.searchableApps = listTitled(numbered("App ", 40));
-        const auto root = SMMenuItem::initWithDictionary(
-            folderInfo("", {folderInfo("Games", {leafInfo("Mines")}), leafInfo("Notes")}));
-        owner.contents.allProgramsMenu = SMMenuItem::initWithSubmenu(*root->submenu());
-        keepsParent = root;
+        owner.contents.allProgramsMenu = SMMenuItem::initWithSubmenu(
+            *listOf({folderInfo("Games", {folderInfo("Cards", {leafInfo("Solitaire")}), leafInfo("Mines")}),
+                     leafInfo("Notes")}));
         owner.contents.nameList = {"one", "two"};
         owner.contents.selectedIndex = 1;
         open();
     }
     const Titles home{"Mail", "|", "Chess", "Paint"};
-    SMMenuItem::Pointer keepsParent;
 };
 
 TEST_F(MenuWindowController, OpensAtHomeSizedToTheScreen) {
@@ -50,7 +45,6 @@ TEST_F(MenuWindowController, ActsOnALeafAndCloses) {
 
 TEST_F(MenuWindowController, OpensAFolderOfTheLeftPaneAndReturns) {
     click("Computer");
-    EXPECT_EQ(menu->searchState(), SMMenuStateFolder);
     EXPECT_EQ(rightTitles(), Titles{"Disk C"});
     EXPECT_EQ(menu->actionButton()->title(), "Back");
     EXPECT_TRUE(menu->currentMenuButton()->highlighted());
@@ -66,16 +60,16 @@ TEST_F(MenuWindowController, OpensAFolderOfTheLeftPaneAndReturns) {
 
 TEST_F(MenuWindowController, UnfoldsFoldersOfAllProgramsInPlace) {
     clickAction();
-    EXPECT_EQ(visibleTitles(*outlets->right), (Titles{"|", "Games", "Notes"}));
     const auto slides = outlets->animations.size();
     click("Games");
-    EXPECT_EQ(visibleTitles(*outlets->right), (Titles{"|", "Games", "Mines", "Notes"}));
+    click("Cards");
+    EXPECT_EQ(visibleTitles(*outlets->right), (Titles{"|", "Games", "Cards", "Solitaire", "Mines", "Notes"}));
+    EXPECT_EQ(outlets->right->menuButtons()[3]->indentation(), 2);
+    click("Cards");
+    EXPECT_EQ(visibleTitles(*outlets->right), (Titles{"|", "Games", "Cards", "Mines", "Notes"}));
     EXPECT_EQ(outlets->animations.size(), slides);
-    click("Games");
-    EXPECT_EQ(visibleTitles(*outlets->right), (Titles{"|", "Games", "Notes"}));
     clickAction();
     EXPECT_EQ(rightTitles(), home);
-    EXPECT_EQ(outlets->animations.back(), SMMenuAnimationBack);
 }
 
 TEST_F(MenuWindowController, GoesHomeAtOnceWhenAMachineIsChosen) {
@@ -128,7 +122,7 @@ TEST_F(MenuWindowController, FindsTheHighlightAgainInNewRows) {
     display();
     EXPECT_EQ(highlighted(), "Paint");
     EXPECT_NE(menu->currentMouseOverMenuButton(), old);
-    outlets->right->setMenuItems(itemsTitled({"other"}));
+    outlets->right->setMenuItems(*listTitled({"other"}));
     display();
     EXPECT_EQ(highlighted(), "none");
 }

@@ -9,7 +9,6 @@
 namespace {
 
 QImage drawn(SMStatusItemView& view) {
-    ensureGuiApplication();
     QImage image(22, 26, QImage::Format_ARGB32_Premultiplied); // a host may grant another size
     image.fill(Qt::transparent);
     QPainter painter(&image);
@@ -18,12 +17,10 @@ QImage drawn(SMStatusItemView& view) {
 }
 
 TEST(StatusItemView, DrawsItsIconInTheMiddleAndFillsItsBoundsOnlyWhileSelected) {
+    ensureGuiApplication();
     SMStatusItemView view(22);
-    EXPECT_EQ(view.frameSize(), (KXSize{30, 22}));
-    EXPECT_EQ(SMStatusItemView::iconRect({30, 23}, {17, 16}), (KXRect{7, 4, 17, 16}))
-        << "halves away from zero";
-    EXPECT_EQ(SMStatusItemView::iconRect({22, 22}, {48, 25}), (KXRect{-13, -2, 48, 25}))
-        << "clipped, not scaled";
+    EXPECT_EQ(SMStatusItemView::iconRect({23, 23}, {48, 16}), (KXRect{-13, 4, 48, 16}))
+        << "clipped, not scaled, halves away from zero";
 
     const QImage plain = drawn(view);
     QRect ink;
@@ -33,16 +30,6 @@ TEST(StatusItemView, DrawsItsIconInTheMiddleAndFillsItsBoundsOnlyWhileSelected) 
     view.setIsSelected(true);
     EXPECT_EQ(drawn(view).pixelColor(21, 25), QGuiApplication::palette().color(QPalette::Highlight));
     EXPECT_EQ(drawn(view).pixelColor(11, 13), QColor(Qt::white));
-}
-
-TEST(StatusItemView, SendsItsActionForEitherButton) {
-    SMStatusItemView view(22);
-    view.mouseDown();
-    std::vector<SMStatusItemView*> senders;
-    view.setAction([&](SMStatusItemView& sender) { senders.push_back(&sender); });
-    view.mouseDown();
-    view.rightMouseDown();
-    EXPECT_EQ(senders, (std::vector{&view, &view}));
 }
 
 } // namespace

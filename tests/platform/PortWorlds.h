@@ -58,7 +58,6 @@ public:
         m_loop.runPending();
     }
 
-    explicit operator bool() const { return m_port != nullptr; }
     void close() {
         if (m_port) m_port->close();
     }

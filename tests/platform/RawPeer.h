@@ -83,11 +83,9 @@ inline std::shared_ptr<platform::Descriptor> Memory(const std::string& contents,
 constexpr int allSeals = F_SEAL_SEAL | F_SEAL_SHRINK | F_SEAL_GROW | F_SEAL_WRITE;
 
 inline std::vector<RawPacket> GoodPackets() {
-    using platform::PacketHeader;
+    const auto header = RawHeader({.flags = platform::PacketHeader::inMemory, .payloadLength = 7});
     return {{"inline", RawHeader({.payloadLength = 7}) + "payload"},
-            {"in memory",
-             RawHeader({.flags = PacketHeader::inMemory, .payloadLength = 7}),
-             {Memory("payload", allSeals)}}};
+            {"in memory", header, {Memory("payload", allSeals)}}};
 }
 
 inline std::vector<RawPacket> BadPackets() {
@@ -100,46 +98,24 @@ inline std::vector<RawPacket> BadPackets() {
     const auto sparse = Memory("", 0);
     EXPECT_EQ(ftruncate(sparse->get(), terabyte), 0);
     EXPECT_EQ(fcntl(sparse->get(), F_ADD_SEALS, allSeals), 0);
-    const auto pipeEnd = [] {
-        int ends[2];
-        EXPECT_EQ(pipe2(ends, O_CLOEXEC), 0);
-        close(ends[1]);
-        return std::make_shared<Descriptor>(ends[0]);
-    };
     const auto memoryHeader = RawHeader({.flags = inMemory, .payloadLength = 7});
     const std::string tooLong(platform::maximalInlinePayload + 1, 'x');
     std::vector<RawPacket> packets{
-        {"half a header", RawHeader({}).substr(0, 12)},
-        {"wrong magic", RawHeader({.magic = {'K', 'X', 'P', 'c'}})},
-        {"wrong version", RawHeader({.version = 2})},
-        {"unknown flag", RawHeader({.flags = 1 << 5})},
         {"a copy", RawHeader({.flags = PacketHeader::tap | PacketHeader::outgoing})},
-        {"watching with a payload", RawHeader({.flags = PacketHeader::tap, .payloadLength = 7}) + "payload"},
         {"an answer", RawHeader({.flags = PacketHeader::isAnswer})},
-        {"length too large by one", RawHeader({.payloadLength = 8}) + "payload"},
-        {"length too small by one", RawHeader({.payloadLength = 6}) + "payload"},
-        {"absurd length", RawHeader({.payloadLength = ~0ULL}) + "payload"},
         {"more than goes inline", RawHeader({.payloadLength = tooLong.size()}) + tooLong},
         {"no descriptor", memoryHeader},
         {"two descriptors", memoryHeader, {sealed, sealed}},
         {"ten descriptors", memoryHeader, std::vector(10, sealed)},
         {"a descriptor too many", RawHeader({.payloadLength = 7}) + "payload", {sealed}},
         {"payload in both places", memoryHeader + "payload", {sealed}},
-        {"a pipe", memoryHeader, {pipeEnd()}},
         {"a file", memoryHeader, {file}},
         {"empty memory", RawHeader({.flags = inMemory}), {Memory("", allSeals)}},
         {"memory too small", RawHeader({.flags = inMemory, .payloadLength = 8}), {sealed}},
         {"memory too large", RawHeader({.flags = inMemory, .payloadLength = 6}), {sealed}},
-        {"over the cap",
-         RawHeader({.flags = inMemory, .payloadLength = platform::maximalPayload + 1}),
-         {sealed}},
         {"a sparse terabyte", RawHeader({.flags = inMemory, .payloadLength = terabyte}), {sparse}},
-        {"a sparse terabyte that says it is less", memoryHeader, {sparse}},
-        {"nothing at all", ""},
     };
     for (const int missing : {F_SEAL_SEAL, F_SEAL_SHRINK, F_SEAL_GROW, F_SEAL_WRITE})
-        packets.push_back({"without seal " + std::to_string(missing),
-                           memoryHeader,
-                           {Memory("payload", allSeals & ~missing)}});
+        packets.push_back({"a seal missing", memoryHeader, {Memory("payload", allSeals & ~missing)}});
     return packets;
 }

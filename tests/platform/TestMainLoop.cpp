@@ -1,6 +1,6 @@
+#include "platform/linux/PollMainLoop.h"
 #include "platform/linux/QtMainLoop.h"
 #include "platform/linux/SystemClock.h"
-#include "tests/support/ManualMainLoop.h"
 
 #include <QCoreApplication>
 #include <gmock/gmock.h>
@@ -101,20 +101,6 @@ TYPED_TEST(MainLoopContract, callsUntilTheHandleEndsEvenFromInsideOrAfterIt) {
     once = loop.startTimer(0ms, 0ms, [] { ADD_FAILURE(); });
     loop.post([] { ADD_FAILURE(); });
     world.loop.reset();
-}
-
-TEST(PollMainLoop, runsTimersAtTheirMoment) {
-    ManualMainLoop loop;
-    std::vector<std::pair<char, int>> calls;
-    const auto start = loop.clock().now();
-    const auto note = [&](char who) {
-        calls.emplace_back(who, static_cast<int>((loop.clock().now() - start) / 1ms));
-    };
-    const auto repeated = loop.startTimer(10ms, 20ms, [&] { note('r'); });
-    const auto once = loop.startTimer(25ms, 0ms, [&] { note('o'); });
-    loop.advance(50ms);
-    EXPECT_THAT(calls,
-                ElementsAre(std::pair('r', 10), std::pair('o', 25), std::pair('r', 30), std::pair('r', 50)));
 }
 
 TEST(PollMainLoop, runsUntilAnotherThreadQuits) {

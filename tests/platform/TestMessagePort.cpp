@@ -13,8 +13,7 @@ const std::string name = "com.example.port";
 } // namespace
 
 template <typename World>
-class PortContract : public testing::Test {
-protected:
+struct PortContract : testing::Test {
     World world;
     ManualMainLoop& loop = world.loop;
 };
@@ -114,7 +113,6 @@ TYPED_TEST(PortContract, tellsOnceThatTheOwnerHasEndedThoughAnotherOwnsTheName) 
     EXPECT_TRUE(client.isListening(name));
     first.reset();
     Listener second(this->loop, this->world.server, name);
-    ASSERT_TRUE(second);
     EXPECT_FALSE(client.isListening(name));
     EXPECT_TRUE(client.isListening(name));
     ASSERT_TRUE(this->loop.runUntil([&] { return !hangUps.empty(); }));
@@ -164,12 +162,7 @@ TYPED_TEST(PortContract, noticesReachEveryObserverOfTheirName) {
     // An observer that ends another keeps it from being called.
     handles.clear();
     for (int i = 0; i < 2; ++i)
-        handles.push_back(here.observe("A", [&] {
-            calls = "once";
-            handles.clear();
-        }));
-    calls.clear();
+        handles.push_back(here.observe("A", [&] { handles.clear(); }));
     there.post("A");
-    ASSERT_TRUE(this->loop.runUntil([&] { return !calls.empty(); }));
-    EXPECT_TRUE(handles.empty());
+    EXPECT_TRUE(this->loop.runUntil([&] { return handles.empty(); }));
 }

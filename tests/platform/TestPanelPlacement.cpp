@@ -4,9 +4,6 @@
 
 namespace {
 
-using platform::PlacePanel;
-using platform::StatusItemFrameAt;
-
 /// The panel as it is asked for: right below the item, one point past its right edge.
 KXRect hanging(const KXRect& item, float width = 480, float height = 500) {
     return {item.maxX() - width + 1, item.y - height, width, height};
@@ -26,24 +23,15 @@ TEST(PanelPlacement, MovesThePanelOnlyFromWhereThereIsNoRoom) {
         {"side bar at the right, beside it", {1240, 700, 40, 22}, {0, 0, 1240, 800}, false, {760, 200}},
         {"right to left, top left", {0, 778, 30, 22}, {0, 0, 1280, 778}, true, {-1, 278}},
         {"right to left, but at the right", {1250, 778, 30, 22}, {0, 0, 1280, 778}, true, {801, 278}},
-        {"screen at the left of the main one",
-         {-30, 1000, 30, 22},
-         {-1024, 300, 1024, 722},
-         false,
-         {-479, 500}},
-        {"too low a screen, still not on the item",
-         {1250, 378, 30, 22},
-         {0, 0, 1280, 378},
-         false,
-         {801, -122}},
+        {"screen left of the main one", {-30, 1000, 30, 22}, {-1024, 300, 1024, 722}, false, {-479, 500}},
+        {"too low, still not on the item", {1250, 378, 30, 22}, {0, 0, 1280, 378}, false, {801, -122}},
+        {"no item yet", {}, {0, 0, 1280, 776}, false, {800, 276}},
+        {"right to left, no item yet", {}, {0, 0, 1280, 776}, true, {0, 276}},
     };
     for (const auto& c : cases) {
-        const KXRect placed = PlacePanel(hanging(c.item), c.item, c.available, c.rightToLeft);
+        const KXRect placed = platform::PlacePanel(hanging(c.item), c.item, c.available, c.rightToLeft);
         EXPECT_EQ(placed, (KXRect{c.placed.x, c.placed.y, 480, 500})) << c.what;
     }
-    const KXRect nowhere{-479, -500, 480, 500};
-    EXPECT_EQ(PlacePanel(nowhere, {}, {0, 0, 1280, 776}, false), (KXRect{800, 276, 480, 500}));
-    EXPECT_EQ(PlacePanel(nowhere, {}, {0, 0, 1280, 776}, true), (KXRect{0, 276, 480, 500}));
 }
 
 TEST(PanelPlacement, LeavesAnItemWithoutABarItsRoom) {
@@ -57,19 +45,17 @@ TEST(PanelPlacement, LeavesAnItemWithoutABarItsRoom) {
 
 TEST(PanelPlacement, GuessesTheItemsFrameFromItsClick) {
     const KXRect screen{0, 0, 1280, 800};
-    const KXSize size{30, 22};
-    EXPECT_EQ(StatusItemFrameAt(KXPoint{1000, 790}, size, screen, {0, 0, 1280, 774}),
-              (KXRect{985, 774, 30, 26}));
-    EXPECT_EQ(StatusItemFrameAt(KXPoint{1000, 10}, size, screen, {0, 32, 1280, 768}),
-              (KXRect{985, 0, 30, 32}));
-    EXPECT_EQ(StatusItemFrameAt(KXPoint{9, 300}, size, screen, {40, 0, 1240, 800}), (KXRect{0, 289, 40, 22}));
-    EXPECT_EQ(StatusItemFrameAt(KXPoint{1270, 300}, size, screen, {0, 0, 1240, 800}),
-              (KXRect{1240, 289, 40, 22}));
-    EXPECT_EQ(StatusItemFrameAt(KXPoint{500, 300}, size, screen, screen), (KXRect{485, 289, 30, 22}))
-        << "a bar that takes no room";
-    EXPECT_EQ(StatusItemFrameAt({}, size, screen, {0, 0, 1280, 774}), (KXRect{1250, 774, 30, 26}));
-    EXPECT_EQ(StatusItemFrameAt({}, size, screen, {0, 32, 1280, 768}), (KXRect{1250, 0, 30, 32}));
-    EXPECT_EQ(StatusItemFrameAt({}, size, screen, screen), (KXRect{1250, 778, 30, 22}));
+    const auto frameAt = [&](std::optional<KXPoint> click, const KXRect& available) {
+        return platform::StatusItemFrameAt(click, {30, 22}, screen, available);
+    };
+    EXPECT_EQ(frameAt({{1000, 790}}, {0, 0, 1280, 774}), (KXRect{985, 774, 30, 26}));
+    EXPECT_EQ(frameAt({{1000, 10}}, {0, 32, 1280, 768}), (KXRect{985, 0, 30, 32}));
+    EXPECT_EQ(frameAt({{9, 300}}, {40, 0, 1240, 800}), (KXRect{0, 289, 40, 22}));
+    EXPECT_EQ(frameAt({{1270, 300}}, {0, 0, 1240, 800}), (KXRect{1240, 289, 40, 22}));
+    EXPECT_EQ(frameAt({{500, 300}}, screen), (KXRect{485, 289, 30, 22})) << "a bar that takes no room";
+    EXPECT_EQ(frameAt({}, {0, 0, 1280, 774}), (KXRect{1250, 774, 30, 26}));
+    EXPECT_EQ(frameAt({}, {0, 32, 1280, 768}), (KXRect{1250, 0, 30, 32}));
+    EXPECT_EQ(frameAt({}, screen), (KXRect{1250, 778, 30, 22}));
 }
 
 } // namespace

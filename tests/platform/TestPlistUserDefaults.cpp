@@ -1,8 +1,6 @@
-#include "lib/plist/Binary.h"
 #include "platform/linux/PlistUserDefaults.h"
 #include "tests/support/ScratchHome.h"
 
-#include <algorithm>
 #include <gtest/gtest.h>
 
 namespace {
@@ -18,11 +16,8 @@ TEST(UserDefaults, FollowTheirFileAndLogABrokenOneOnce) {
         std::filesystem::last_write_time(file, std::filesystem::file_time_type(std::chrono::hours(++writes)));
     };
     const auto variant = [&] { return defaults.integerForKey("AppleAquaColorVariant"); };
-    const auto logLines = [] { return std::ranges::count(ScratchHome::log(), '\n'); };
-    std::string error;
-    const auto bytes =
-        plist::WriteBinary(plist::Dictionary{{"AppleAquaColorVariant", 6}, {"x", "6"}}, error).joined();
-    const std::string_view settings(reinterpret_cast<const char*>(bytes.data()), bytes.size());
+    constexpr auto settings = "<plist><dict><key>AppleAquaColorVariant</key><integer>6</integer>"
+                              "<key>x</key><string>6</string></dict></plist>";
 
     EXPECT_EQ(variant(), 0);
     write(settings);
@@ -30,11 +25,11 @@ TEST(UserDefaults, FollowTheirFileAndLogABrokenOneOnce) {
     EXPECT_EQ(defaults.integerForKey("x") + defaults.integerForKey("absent"), 0);
     std::filesystem::remove(file);
     EXPECT_EQ(variant(), 0);
-    EXPECT_EQ(logLines(), 0) << "a missing file is nothing to report";
+    EXPECT_EQ(ScratchHome::logged("\n"), 0) << "a missing file is nothing to report";
     for (const int problems : {1, 2}) {
         write("broken");
         EXPECT_EQ(variant() + variant(), 0);
-        EXPECT_EQ(logLines(), problems);
+        EXPECT_EQ(ScratchHome::logged("\n"), problems);
     }
     write(settings);
     EXPECT_EQ(variant(), 6);

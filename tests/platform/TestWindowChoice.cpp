@@ -1,7 +1,4 @@
-#include "lib/plist/Binary.h"
-#include "platform/linux/DockDefaults.h"
 #include "platform/linux/WindowChoice.h"
-#include "tests/support/ScratchHome.h"
 
 #include <gmock/gmock.h>
 
@@ -29,24 +26,4 @@ TEST(WindowChoice, WorksOutTheGridOfDesktops) {
     EXPECT_EQ(grid({0, 2, 0, 0}, 5), std::pair(2u, 3u));
     EXPECT_EQ(grid({0, 0, 0, 0}, 0), std::pair(1u, 1u));
     EXPECT_EQ(grid({0, 0xFFFFFFFF, 0}, 0xFFFFFFFF), std::pair(1024u, 1u));
-}
-
-TEST(DockDefaults, ComeFromTheDesktopUnlessTheFileSaysWhetherThereAreWorkspaces) {
-    const ScratchHome home;
-    const auto file = home.path() / "Library/Preferences/com.apple.dock.plist";
-    std::filesystem::create_directories(file.parent_path());
-    std::optional<DesktopGrid> desktop;
-    const DockDefaults dock([&] { return desktop; });
-    const auto values = [&] {
-        return std::vector{dock.integerForKey("workspaces"), dock.integerForKey("workspaces-cols"),
-                           dock.integerForKey("workspaces-rows")};
-    };
-    EXPECT_THAT(values(), ElementsAre(0, 1, 1));
-    desktop = DesktopGrid{3, 2};
-    EXPECT_THAT(values(), ElementsAre(1, 3, 2));
-    std::string error;
-    const auto bytes = plist::WriteBinary(plist::Dictionary{{"workspaces", true}}, error).joined();
-    std::ofstream(file).write(reinterpret_cast<const char*>(bytes.data()),
-                              static_cast<std::streamsize>(bytes.size()));
-    EXPECT_THAT(values(), ElementsAre(1, 0, 0));
 }

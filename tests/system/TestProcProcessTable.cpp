@@ -1,14 +1,13 @@
 #include "platform/linux/PollMainLoop.h"
 #include "platform/linux/ProcProcessTable.h"
 #include "platform/linux/SystemClock.h"
+#include "tests/platform/Child.h"
 #include "tests/support/ManualClock.h"
 #include "tests/support/ScratchHome.h"
 
 #include <algorithm>
-#include <csignal>
 #include <gtest/gtest.h>
-#include <sys/wait.h>
-#include <unistd.h>
+#include <sys/stat.h>
 
 using namespace std::chrono_literals;
 namespace fs = std::filesystem;
@@ -16,23 +15,6 @@ namespace fs = std::filesystem;
 namespace {
 
 platform::SystemClock systemClock;
-
-/// A process that does nothing until it is killed, and stays a zombie then.
-struct Child {
-    ~Child() {
-        ::kill(pid, SIGKILL);
-        waitpid(pid, nullptr, 0);
-    }
-    static pid_t start() {
-        const auto handler = signal(SIGTERM, SIG_IGN); // the child's from its first moment
-        const pid_t pid = fork();
-        while (pid == 0)
-            pause();
-        signal(SIGTERM, handler);
-        return pid;
-    }
-    const pid_t pid = start();
-};
 
 struct ProcProcessTable : testing::Test {
     bool walkFinds(int pid) const {
@@ -53,14 +35,14 @@ TEST_F(ProcProcessTable, KnowsAProcessByIdAndStartUntilItIsAZombie) {
     EXPECT_EQ(table.info(*current)->executablePath, fs::read_symlink("/proc/self/exe"));
 
     const Child child;
-    const auto process = table.serialNumberOf(child.pid);
-    ASSERT_TRUE(process && table.info(*process) && walkFinds(child.pid));
-    EXPECT_TRUE(table.terminate(*process)) << "which the child ignores";
+    const auto process = table.serialNumberOf(child.pid());
+    ASSERT_TRUE(process && table.info(*process) && walkFinds(child.pid()));
+    EXPECT_TRUE(table.terminate(*process)) << "which does not reach a child that stands still";
     EXPECT_TRUE(table.kill(*process));
     siginfo_t info;
-    waitid(P_PID, static_cast<id_t>(child.pid), &info, WEXITED | WNOWAIT);
-    EXPECT_FALSE(walkFinds(child.pid));
-    EXPECT_FALSE(table.serialNumberOf(child.pid));
+    waitid(P_PID, static_cast<id_t>(child.pid()), &info, WEXITED | WNOWAIT);
+    EXPECT_FALSE(walkFinds(child.pid()));
+    EXPECT_FALSE(table.serialNumberOf(child.pid()));
     const platform::ProcessSerialNumber reused{current->highLongOfPSN + 1, current->lowLongOfPSN};
     for (const auto ended : {*process, reused, platform::ProcessSerialNumber{}}) {
         EXPECT_FALSE(table.info(ended));
@@ -72,7 +54,7 @@ TEST_F(ProcProcessTable, KnowsAProcessByIdAndStartUntilItIsAZombie) {
 TEST_F(ProcProcessTable, CallsOnceWhenAProcessEnds) {
     const Child child, survivor;
     int calls = 0;
-    const auto process = *table.serialNumberOf(child.pid);
+    const auto process = *table.serialNumberOf(child.pid());
     std::unique_ptr<platform::Handle> watch, letGo;
     watch = table.watchExit(process, [&] {
         ++calls;
@@ -80,21 +62,15 @@ TEST_F(ProcProcessTable, CallsOnceWhenAProcessEnds) {
     });
     const auto kept = table.watchExit(process, [&] { ++calls; });
     letGo = table.watchExit(process, [] { ADD_FAILURE(); });
-    const auto living = table.watchExit(*table.serialNumberOf(survivor.pid), [] { ADD_FAILURE(); });
+    const auto living = table.watchExit(*table.serialNumberOf(survivor.pid()), [] { ADD_FAILURE(); });
     letGo.reset();
-    ::kill(child.pid, SIGKILL);
+    ::kill(child.pid(), SIGKILL);
     EXPECT_TRUE(loop.runUntil([&] { return calls == 2; }, 30s));
     EXPECT_FALSE(loop.turn(0ms));
 }
 
 /// A /proc, a prefix and data directories of the test's own.
 struct ApplicationOfProcess : testing::Test {
-    ApplicationOfProcess() {
-        fs::create_directory(path("proc"));
-        table.emplace(loop, clock,
-                      platform::ProcProcessTable::Places{
-                          path("proc"), {path("home"), path("data")}, {path("nowhere"), path("usr/bin")}});
-    }
     std::string path(const std::string& name) const { return root.path() / name; }
 
     void write(const std::string& name, const std::string& text) const {
@@ -121,14 +97,16 @@ struct ApplicationOfProcess : testing::Test {
         setExecutable(pid, executable);
     }
     std::optional<platform::ProcessInfo> info(int pid) {
-        return table->info({77, static_cast<std::uint32_t>(pid)});
+        return table.info({77, static_cast<std::uint32_t>(pid)});
     }
     std::optional<std::string> idOf(int pid) { return info(pid).value().bundleIdentifier; }
 
     ScratchHome root;
     ManualClock clock;
     platform::PollMainLoop loop{systemClock};
-    std::optional<platform::ProcProcessTable> table;
+    const bool hasProc = fs::create_directory(path("proc"));
+    platform::ProcProcessTable table{
+        loop, clock, {path("proc"), {path("home"), path("data")}, {path("nowhere"), path("usr/bin")}}};
 };
 
 TEST_F(ApplicationOfProcess, IsTheEntryOfItsPrefixBeforeAnyOther) {
@@ -160,8 +138,7 @@ TEST_F(ApplicationOfProcess, IsTheEntryOfItsPrefixBeforeAnyOther) {
 TEST_F(ApplicationOfProcess, IsWhatItsSandboxSays) {
     start(10, "usr/bin/edit");
     writeEntry("usr/share/applications/edit.desktop", "Exec=edit");
-    writeEntry("data/applications/org.example.Boxed.desktop",
-               "Exec=flatpak run org.example.Boxed\nNoDisplay=true");
+    writeEntry("data/applications/org.example.Boxed.desktop", "Exec=flatpak run x\nNoDisplay=true");
     write("proc/10/root/.flatpak-info", "[Application]\nname=org.example.Boxed\n[Instance]\nname=x\n");
     EXPECT_EQ(idOf(10), "org.example.Boxed");
     EXPECT_EQ(info(10)->bundlePath, path("data/applications/org.example.Boxed.desktop"));
@@ -185,12 +162,12 @@ TEST_F(ApplicationOfProcess, IsItsUnitForTheUnitsTopProcessAlone) {
 }
 
 TEST_F(ApplicationOfProcess, IsLookedAtAgainUntilItHasRunOneProgramForTenSeconds) {
-    const auto idInWalk = [&] { return table->nextProcess({}).value().bundleIdentifier; };
+    const auto idInWalk = [&] { return table.nextProcess({}).value().bundleIdentifier; };
     start(10, "usr/bin/edit");
-    for (const char* program : {"edit", "draw", "play"})
-        writeEntry("data/applications/" + std::string(program) + ".desktop", "Exec=" + std::string(program));
-    for (const char* program : {"usr/bin/draw", "usr/bin/play"})
-        write(program, "");
+    for (const std::string program : {"edit", "draw", "play"}) {
+        writeEntry("data/applications/" + program + ".desktop", "Exec=" + program);
+        write("usr/bin/" + program, "");
+    }
     write("proc/uptime", "10.77 0\n");
     EXPECT_EQ(idInWalk(), "edit");
     setExecutable(10, "usr/bin/draw");
@@ -209,25 +186,23 @@ TEST_F(ApplicationOfProcess, IsLookedAtAgainUntilItHasRunOneProgramForTenSeconds
 TEST_F(ApplicationOfProcess, FollowsTheEntriesThatComeAndGo) {
     const auto entry = "data/applications/org.example.Edit.desktop";
     const auto now = fs::file_time_type::clock::now();
-    const auto stampDirectory = [&](fs::file_time_type time) {
-        fs::last_write_time(path("data/applications"), time);
-    };
+    const auto folder = path("data/applications");
     start(10, "usr/bin/edit");
     writeEntry(entry, "Exec=edit");
-    stampDirectory(now - 20s);
+    fs::last_write_time(folder, now - 20s);
     EXPECT_EQ(idOf(10), "org.example.Edit");
     writeEntry(entry, "Exec=other");
     clock.advance(100ms);
     EXPECT_EQ(idOf(10), "org.example.Edit") << "an unchanged directory is not read again";
-    stampDirectory(now + 20s);
+    fs::last_write_time(folder, now + 20s);
     EXPECT_EQ(idOf(10), "org.example.Edit") << "nor is one looked at again at once";
     clock.advance(100ms);
     EXPECT_FALSE(idOf(10));
     writeEntry(entry, "Exec=edit");
-    stampDirectory(now + 20s);
+    fs::last_write_time(folder, now + 20s);
     clock.advance(100ms);
     EXPECT_EQ(idOf(10), "org.example.Edit") << "one that changed just before may have changed again";
-    fs::remove_all(path("data/applications"));
+    fs::remove_all(folder);
     clock.advance(100ms);
     EXPECT_FALSE(idOf(10));
 }

@@ -24,6 +24,25 @@ inline std::string errorOf(std::string_view text, const Limits& limits = {}) {
     return errorOf(dataOf(text), limits);
 }
 
+/// Fails the test when the file is refused.
+inline Value parsed(const Data& file) {
+    std::string error;
+    const Value value = Parse(file, error);
+    EXPECT_EQ(error, "");
+    return value;
+}
+/// Fails the test when the value cannot be written.
+inline Encoded written(const Value& value) {
+    std::string error;
+    const Encoded encoded = WriteBinary(value, error);
+    EXPECT_EQ(error, "");
+    return encoded;
+}
+/// The same value as a view into its written form.
+inline Value reread(const Value& value) {
+    return parsed(written(value).joined());
+}
+
 inline std::string bigEndian(std::uint64_t number, std::size_t size) {
     std::string bytes(size, '\0');
     for (; size > 0; --size, number >>= 8)

@@ -1,13 +1,16 @@
-#include "lib/plist/Binary.h"
 #include "tests/plist/RawFile.h"
 
-#include <gtest/gtest.h>
-
+#include <algorithm>
 #include <bit>
+#include <gtest/gtest.h>
 
 namespace plist {
 
 namespace {
+
+std::string bytesOf(const Data& file) {
+    return {reinterpret_cast<const char*>(file.data()), file.size()};
+}
 
 std::vector<std::uint64_t> times(std::size_t count, std::uint64_t reference) {
     return std::vector<std::uint64_t>(count, reference);
@@ -26,8 +29,7 @@ Data bomb(std::size_t levels, std::size_t width) {
 std::size_t readAll(const Value& value) {
     std::size_t read = value.stringOr({}).size() + value["key"].size();
     const Data data = value.data();
-    for (const std::byte each : data.span())
-        read += each == std::byte{} ? 1 : 2;
+    read += static_cast<std::size_t>(std::ranges::count(data.span(), std::byte{}));
     for (std::size_t i = 0; i < value.size(); ++i)
         read += value.keyAt(i).size() + readAll(value.at(i));
     return read;
@@ -35,11 +37,7 @@ std::size_t readAll(const Value& value) {
 
 TEST(HostileBinary, MalformedFilesAreRefused) {
     const std::string one = "\x09";
-    struct Case {
-        const char* error;
-        std::vector<std::string> objects;
-    };
-    const Case cases[] = {
+    const std::pair<const char*, std::vector<std::string>> cases[] = {
         {"a reference points past the last object", {RawFile::array({1})}},
         {"a container holds itself", {RawFile::array({0})}},
         {"a container holds itself", {RawFile::array({1}), RawFile::dictionary({2, 0}), "Qk"}},
@@ -59,41 +57,41 @@ TEST(HostileBinary, MalformedFilesAreRefused) {
         {"an object is longer than the file", {"\xDF\x13" + bigEndian(std::uint64_t{1} << 61, 8)}},
         {"an object is longer than the file", {"\xA2" + bigEndian(1, 4) + "\x09"}},
     };
-    for (const Case& each : cases)
-        EXPECT_EQ(errorOf(RawFile{each.objects}.build()), each.error);
+    for (const auto& [error, objects] : cases)
+        EXPECT_EQ(errorOf(RawFile{objects}.build()), error);
 }
 
 TEST(HostileBinary, WrongTrailersAreRefused) {
     const Data file = RawFile{{"\x09"}}.build();
-    const std::string whole(reinterpret_cast<const char*>(file.data()), file.size());
-    const auto with = [&](std::size_t fromEnd, std::uint64_t number, std::size_t size) {
-        std::string changed = whole;
-        return dataOf(changed.replace(changed.size() - fromEnd, size, bigEndian(number, size)));
+    const std::string whole = bytesOf(file);
+    const struct {
+        std::size_t fromEnd, size;
+        std::vector<std::uint64_t> numbers;
+        const char* error;
+    } changes[] = {
+        {40, 8, {0, 7, 9, UINT64_MAX}, "an object lies outside the file"},
+        {26, 1, {0, 9, 255}, "the trailer is malformed"},
+        {25, 1, {0, 9, 255}, "the trailer is malformed"},
+        {24, 8, {2, std::uint64_t{1} << 63, UINT64_MAX}, "the table of offsets is longer than the file"},
+        {16, 8, {1, UINT64_MAX}, "a reference points past the last object"},
+        {8, 8, {7, 18, UINT64_MAX}, "the table of offsets lies outside the file"},
     };
+    for (const auto& [fromEnd, size, numbers, error] : changes)
+        for (const std::uint64_t number : numbers) {
+            std::string changed = whole;
+            changed.replace(changed.size() - fromEnd, size, bigEndian(number, size));
+            EXPECT_EQ(errorOf(changed), error);
+        }
     EXPECT_EQ(errorOf("text"), "not a property list");
     EXPECT_EQ(errorOf("bplist00"), "the file is too short");
-    EXPECT_EQ(errorOf(dataOf("bplist01" + whole.substr(8))), "not a binary property list");
+    EXPECT_EQ(errorOf("bplist01" + whole.substr(8)), "not a binary property list");
     EXPECT_EQ(errorOf(file, {.bytes = file.size() - 1}), "the file is too large");
-    for (const std::uint64_t width : {0u, 9u, 255u}) {
-        EXPECT_EQ(errorOf(with(26, width, 1)), "the trailer is malformed");
-        EXPECT_EQ(errorOf(with(25, width, 1)), "the trailer is malformed");
-    }
-    for (const std::uint64_t count : {std::uint64_t{2}, std::uint64_t{1} << 63, UINT64_MAX})
-        EXPECT_EQ(errorOf(with(24, count, 8)), "the table of offsets is longer than the file");
-    for (const std::uint64_t top : {std::uint64_t{1}, UINT64_MAX})
-        EXPECT_EQ(errorOf(with(16, top, 8)), "a reference points past the last object");
-    for (const std::uint64_t table : {std::uint64_t{7}, std::uint64_t{18}, UINT64_MAX})
-        EXPECT_EQ(errorOf(with(8, table, 8)), "the table of offsets lies outside the file");
-    for (const std::uint64_t offset : {std::uint64_t{0}, std::uint64_t{7}, std::uint64_t{9}, UINT64_MAX})
-        EXPECT_EQ(errorOf(with(40, offset, 8)), "an object lies outside the file");
 }
 
 TEST(HostileBinary, NestingIsBounded) {
     EXPECT_EQ(errorOf(bomb(512, 1)), "");
-    EXPECT_EQ(errorOf(bomb(513, 1)), "nested too deeply");
+    EXPECT_EQ(errorOf(bomb(513, 1), {.nesting = 1000}), "nested too deeply");
     EXPECT_EQ(errorOf(bomb(100'000, 1)), "nested too deeply");
-    EXPECT_EQ(errorOf(bomb(3, 1), {.nesting = 2}), "nested too deeply");
-    EXPECT_EQ(errorOf(bomb(600, 1), {.nesting = 1000}), "nested too deeply");
 
     // Seen first near the top, then again where it no longer fits.
     RawFile shared{
@@ -103,10 +101,8 @@ TEST(HostileBinary, NestingIsBounded) {
 }
 
 TEST(HostileBinary, SharedReferencesAreCountedEachTime) {
-    EXPECT_EQ(errorOf(bomb(3, 10)), ""); // 1 + 10 + 100 + 1000 objects
-    EXPECT_EQ(errorOf(bomb(3, 10), {.objects = 1111}), "");
+    EXPECT_EQ(errorOf(bomb(3, 10), {.objects = 1111}), ""); // 1 + 10 + 100 + 1000
     EXPECT_EQ(errorOf(bomb(3, 10), {.objects = 1110}), "too many objects");
-    EXPECT_EQ(errorOf(bomb(8, 10)), "too many objects");
     EXPECT_EQ(errorOf(bomb(400, 100)), "too many objects");
     EXPECT_EQ(errorOf(RawFile{std::vector<std::string>(20, "\x09")}.build(), {.objects = 19}),
               "too many objects");
@@ -121,52 +117,42 @@ TEST(HostileBinary, MegabytesReferredToOftenAreNotMultiplied) {
     EXPECT_EQ(errorOf(file('\x5F', megabyte, megabyte.size())), "too many objects");
     EXPECT_EQ(errorOf(file('\x6F', megabyte, megabyte.size() / 2)), "too many objects");
 
-    std::string error;
-    const Value data = Parse(file('\x4F', megabyte, megabyte.size()), error);
-    ASSERT_EQ(data.size(), 4000u) << error;
-    EXPECT_LT(WriteBinary(data, error).size, megabyte.size() + 10'000);
+    const Value data = parsed(file('\x4F', megabyte, megabyte.size()));
+    ASSERT_EQ(data.size(), 4000u);
+    EXPECT_LT(written(data).size, megabyte.size() + 10'000);
 }
 
 TEST(HostileBinary, ObjectsDoNotOverlap) {
-    // A thousand objects of a thousand references each, all in the same place.
-    std::string objects = "bplist00" + RawFile::array({}), table = bigEndian(8, 8);
-    const std::string many = RawFile::array(times(1000, 1001));
-    for (int i = 0; i < 1000; ++i)
-        table += bigEndian(objects.size(), 8);
-    table += bigEndian(objects.size() + many.size(), 8);
-    std::vector<std::uint64_t> all;
-    for (std::uint64_t i = 1; i <= 1000; ++i)
-        all.push_back(i);
-    table.replace(0, 8, bigEndian(objects.size() + many.size() + 1, 8));
-    EXPECT_EQ(errorOf(RawFile::finish(objects + many + '\x09' + RawFile::array(all), table)),
-              "objects overlap");
+    // Two arrays of a thousand references in the same place.
+    const std::string top = "bplist00" + RawFile::array({1, 2}), both = RawFile::array(times(1000, 3));
+    std::string table;
+    for (const std::size_t offset : {std::size_t{8}, top.size(), top.size(), top.size() + both.size()})
+        table += bigEndian(offset, 8);
+    EXPECT_EQ(errorOf(RawFile::finish(top + both + '\x09', table)), "objects overlap");
 }
 
 TEST(HostileBinary, EveryCutAndEveryChangeOfAByteIsSafe) {
-    std::string error;
     // No number in it is a change of one byte away from NaN, which equals nothing.
     const Value original = Dictionary{{"name", "up"},
                                       {"é", Array{1, INT64_MIN / 2, 2.0, true, Date{1e9}, UINT64_MAX}},
                                       {"icon", dataOf(std::string(3, 'i'))},
                                       {"nested", Dictionary{{"name", Array{"😀", Array{}, "up"}}}}};
-    const Data file = WriteBinary(original, error).joined();
-    const std::string whole(reinterpret_cast<const char*>(file.data()), file.size());
+    const std::string whole = bytesOf(written(original).joined());
     for (std::size_t size = 0; size < whole.size(); ++size)
-        EXPECT_NE(errorOf(dataOf(whole.substr(0, size))), "");
+        EXPECT_NE(errorOf(whole.substr(0, size)), "");
 
     std::size_t read = 0;
     for (std::size_t at = 0; at < whole.size(); ++at) {
         for (unsigned change = 1; change < 256; ++change) {
             std::string changed = whole;
             changed[at] = static_cast<char>(static_cast<unsigned char>(changed[at]) ^ change);
-            error.clear();
+            std::string error;
             const Value value = Parse(dataOf(changed), error);
             EXPECT_EQ(value.isNil(), !error.empty());
             if (value.isNil()) continue;
             read += readAll(value) + value.description().size();
             if (!std::has_single_bit(change)) continue;
-            const Value again = Parse(WriteBinary(value, error).joined(), error);
-            ASSERT_EQ(again, value) << "byte " << at << " changed by " << change << ": " << error;
+            ASSERT_EQ(reread(value), value) << "byte " << at << " changed by " << change;
         }
     }
     EXPECT_GT(read, 0u);

@@ -1,8 +1,6 @@
-#include "lib/plist/XML.h"
 #include "tests/plist/RawFile.h"
 
 #include <gtest/gtest.h>
-
 #include <limits>
 
 namespace plist {
@@ -14,8 +12,7 @@ std::string listOf(const std::string& content) {
 }
 
 TEST(XML, ReadsEveryType) {
-    std::string error;
-    const Value value = Parse(dataOf(R"(<?xml version="1.0" encoding="UTF-8"?>
+    const Value value = parsed(dataOf(R"(<?xml version="1.0" encoding="UTF-8"?>
 <!DOCTYPE plist SYSTEM "PropertyList.dtd">
 <!-- settings -->
 <plist version="1.0">
@@ -36,8 +33,7 @@ TEST(XML, ReadsEveryType) {
     <key>twice</key> <dict/>
 </dict>
 </plist>
-)"),
-                              error);
+)"));
     const Value expected =
         Dictionary{{"a & b", " <é😀><& "},
                    {"numbers", Array{UINT64_MAX, INT64_MIN, 31, -1500.0,
@@ -46,12 +42,12 @@ TEST(XML, ReadsEveryType) {
                    {"data", dataOf({"\0\1\2\xFF", 4})},
                    {"empty", Array{}},
                    {"twice", Dictionary{}}};
-    EXPECT_EQ(value, expected) << error << value.description();
+    EXPECT_EQ(value, expected) << value.description();
     EXPECT_EQ(value.keyAt(5), "twice");
 
     const std::string latin = "<?xml version='1.0' encoding='ISO-8859-1'?>" + listOf("<string>\xE9</string>");
-    EXPECT_EQ(Parse(dataOf(latin), error), Value("é"));
-    EXPECT_EQ(Parse(dataOf("\xEF\xBB\xBF" + listOf("<string/>")), error), Value(""));
+    EXPECT_EQ(parsed(dataOf(latin)), Value("é"));
+    EXPECT_EQ(parsed(dataOf("\xEF\xBB\xBF" + listOf("<string/>"))), Value(""));
 }
 
 TEST(XML, RefusesWhatIsNoPropertyList) {
@@ -85,9 +81,7 @@ TEST(XML, IsBounded) {
     const auto nested = [](int depth) {
         std::string text;
         for (int i = 0; i < depth; ++i)
-            text += "<array>";
-        for (int i = 0; i < depth; ++i)
-            text += "</array>";
+            text = "<array>" + text + "</array>";
         return listOf(text);
     };
     EXPECT_EQ(errorOf(nested(512)), "");
@@ -105,8 +99,7 @@ TEST(XML, IsBounded) {
     std::string entries;
     for (int i = 0; i < 50'000; ++i)
         entries += "<key>" + std::to_string(i % 40'000) + "</key><true/>";
-    std::string error;
-    EXPECT_EQ(Parse(dataOf(listOf("<dict>" + entries + "</dict>")), error).size(), 40'000u);
+    EXPECT_EQ(parsed(dataOf(listOf("<dict>" + entries + "</dict>"))).size(), 40'000u);
 }
 
 } // namespace

@@ -26,8 +26,10 @@ Bytes pixelAt(const Bitmap& from, int x, int y) {
     return {p, p + 4};
 }
 
-/// Exactly one entry, with this text in it.
-void expectLogged(const std::string& text) {
+/// It does nothing but log exactly one entry, with this text in it.
+void expectRefused(const std::string& text, auto&& call) {
+    const ScratchHome home;
+    EXPECT_FALSE(call());
     EXPECT_EQ(ScratchHome::logged("\n"), 1) << ScratchHome::log();
     EXPECT_EQ(ScratchHome::logged(text), 1) << ScratchHome::log() << " lacks " << text;
 }
@@ -41,11 +43,11 @@ TEST(Bitmap, CreationChecksItsParameters) {
         int bytesPerRow;
         const char* complaint;
     } cases[] = {
-        {memory.data(), 4, 4, 0, 0,
+        {nullptr, 4, 4, 0, 15,
          "imageRepWith32bitBuffer:pixelsWide:pixelsHigh:bitmapFormat:bytesPerRow:]: invalid bitmap creation "
-         "parameters: buffer=0x"},
-        {memory.data(), 4, 4, 0, 15, ", width=4, height=4, format=0, bytesPerRow=15\n"},
-        {nullptr, 4, 4, 0, 15, "invalid bitmap creation parameters: buffer=(nil)"},
+         "parameters: buffer=(nil), width=4, height=4, format=0, bytesPerRow=15\n"},
+        {memory.data(), 4, 4, 0, 0, "buffer=0x"},
+        {memory.data(), 4, 4, 0, 15, "invalid"},
         {nullptr, 0, 4, 0, 0, "invalid"},
         {nullptr, 4, -1, 0, 0, "invalid"},
         {nullptr, 4, 4, 4, 0, "format=4"},
@@ -57,16 +59,14 @@ TEST(Bitmap, CreationChecksItsParameters) {
         {nullptr, 65536, 65537, 0, 0, "could not create"},
         {memory.data(), 1, std::numeric_limits<int>::max(), 0, 64, "could not create"},
     };
-    for (const auto& c : cases) {
-        const ScratchHome home;
-        EXPECT_FALSE(Bitmap::imageRepWith32bitBuffer(c.buffer, c.wide, c.high, c.format, c.bytesPerRow));
-        expectLogged(c.complaint);
-    }
-    const auto own = bitmap(3, 2);
-    EXPECT_EQ(pixelAt(*own, 2, 1), Bytes(4)) << "cleared";
+    for (const auto& c : cases)
+        expectRefused(c.complaint, [&] {
+            return Bitmap::imageRepWith32bitBuffer(c.buffer, c.wide, c.high, c.format, c.bytesPerRow);
+        });
+    EXPECT_EQ(pixelAt(*bitmap(3, 2), 2, 1), Bytes(4)) << "cleared";
     const auto over = Bitmap::imageRepWith32bitBuffer(memory.data(), 3, 4, 3, 16);
-    EXPECT_EQ(over->bitmapData(), memory.data());
-    EXPECT_EQ(pixelAt(*over, 2, 3), Bytes(4, 9)) << "the caller's memory stays";
+    memory[3 * 16 + 2 * 4] = 1;
+    EXPECT_EQ(pixelAt(*over, 2, 3), (Bytes{1, 9, 9, 9})) << "the caller's memory is used as it is";
 }
 
 TEST(Bitmap, IconBuffersAreFlippedAndReordered) {
@@ -77,11 +77,10 @@ TEST(Bitmap, IconBuffersAreFlippedAndReordered) {
     EXPECT_EQ(pixelAt(*icon, 0, 1), (Bytes{0xFF, 0x30, 0x20, 0x10}));
     EXPECT_EQ(pixelAt(*icon, 0, 0), (Bytes{8, 7, 6, 5}))
         << "rows follow one another, whatever their length is said to be";
+    expectRefused("pixelsWide:pixelsHigh:bytesPerRow:]: invalid BGRA bitmap parameters: buffer=0x",
+                  [&] { return Bitmap::imageRepFromFlippedBGRABuffer(rows.data(), 0x40000001, 1, 4); });
     const ScratchHome home;
-    EXPECT_FALSE(Bitmap::imageRepFromFlippedBGRABuffer(rows.data(), 0x40000001, 1, 4));
-    expectLogged("pixelsWide:pixelsHigh:bytesPerRow:]: invalid BGRA bitmap parameters: buffer=0x");
     EXPECT_FALSE(Bitmap::imageRepFromFlippedBGRABuffer(nullptr, 1, 1, 4));
-    EXPECT_FALSE(Bitmap::imageRepFromFlippedBGRABuffer(rows.data(), 65536, 65537, 65536 * 4));
 }
 
 TEST(Bitmap, ConvertsBetweenItsLayouts) {
@@ -99,33 +98,29 @@ TEST(Bitmap, ConvertsBetweenItsLayouts) {
         EXPECT_EQ(pixelAt(*made, 2, 0), after) << from << " to " << to;
         EXPECT_EQ(made->bitmapFormat(), from) << "what is declared stays";
     }
+    expectRefused(": invalid bitmap conversion parameters: srcFormat=4, dstFormat=4, bitmap: ",
+                  [] { return bitmap(1, 1)->convertBitmapDataFromFormat(4, 4); });
     const ScratchHome home;
-    EXPECT_FALSE(bitmap(1, 1)->convertBitmapDataFromFormat(4, 4))
-        << "checks come before the test for equality";
-    expectLogged(": invalid bitmap conversion parameters: srcFormat=4, dstFormat=4, bitmap: ");
     EXPECT_FALSE(Bitmap::imageRepWithPixels(2, 2, 24)->convertBitmapDataFromFormat(0, 1));
 }
 
 TEST(Bitmap, CopiesBlocksFromTheBottomLeft) {
     const Bytes red{255, 0, 0, 255};
     const auto source = bitmap(4, 4, 0, red);
-    const struct {
-        KXPoint offset;
-        int left, top, right, bottom;
-    } cases[] = {{{0, 0}, 0, 4, 4, 8}, {{6, 7}, 6, 0, 8, 1},      {{-3, -3}, 0, 7, 1, 8},
-                 {{8, 0}, 0, 0, 0, 0}, {{0, -1e30f}, 0, 0, 0, 0}, {{1e38f, 1e38f}, 0, 0, 0, 0}};
-    for (const auto& c : cases) {
+    const std::pair<KXPoint, QRect> cases[] = {{{0, 0}, {0, 4, 4, 4}},   {{6, 7}, {6, 0, 2, 1}},
+                                               {{-3, -3}, {0, 7, 1, 1}}, {{8, 0}, {}},
+                                               {{0, -1e30f}, {}},        {{1e38f, 1e38f}, {}}};
+    for (const auto& [offset, covered] : cases) {
         const auto target = bitmap(8, 8);
-        EXPECT_TRUE(source->copyBitmapDataIntoRep(*target, c.offset));
-        for (int y = 0; y < 8; ++y)
-            for (int x = 0; x < 8; ++x)
-                ASSERT_EQ(pixelAt(*target, x, y) == red,
-                          x >= c.left && x < c.right && y >= c.top && y < c.bottom)
-                    << c.offset.x << " at " << x << ", " << y;
+        EXPECT_TRUE(source->copyBitmapDataIntoRep(*target, offset));
+        for (int at = 0; at < 8 * 8; ++at)
+            ASSERT_EQ(pixelAt(*target, at % 8, at / 8) == red, covered.contains(at % 8, at / 8))
+                << offset.x << " at " << at;
     }
+    expectRefused(": invalid bitmap copy parameters: offset={0.5, 0}, source=", [&] {
+        return source->copyBitmapDataIntoRep(*bitmap(8, 8), {0.5f, 0});
+    });
     const ScratchHome home;
-    EXPECT_FALSE(source->copyBitmapDataIntoRep(*bitmap(8, 8), {0.5f, 0}));
-    expectLogged(": invalid bitmap copy parameters: offset={0.5, 0}, source=");
     EXPECT_FALSE(source->copyBitmapDataIntoRep(*source, {}));
     EXPECT_FALSE(source->copyBitmapDataIntoRep(*bitmap(8, 8), {std::numeric_limits<float>::infinity(), 0}));
     EXPECT_FALSE(source->copyBitmapDataIntoRep(*Bitmap::imageRepWithPixels(8, 8, 24), {}));
@@ -138,10 +133,9 @@ TEST(Bitmap, MultipliesOnlyWhatItCovers) {
     EXPECT_EQ(pixelAt(*target, 3, 0), (Bytes{0, 0, 0, 250}));
     EXPECT_EQ(pixelAt(*target, 2, 0), (Bytes{200, 100, 50, 250}));
     EXPECT_EQ(pixelAt(*target, 3, 1), (Bytes{200, 100, 50, 250}));
-    const ScratchHome home;
     target->setColorSpaceName("NSDeviceRGBColorSpace");
-    EXPECT_FALSE(black->multiplyPixelDataIntoBitmapRep(*target, {}));
-    expectLogged("multiplyPixelDataIntoBitmapRep:offset:]: invalid parameters: offset={0, 0}, source=");
+    expectRefused("multiplyPixelDataIntoBitmapRep:offset:]: invalid parameters: offset={0, 0}, source=",
+                  [&] { return black->multiplyPixelDataIntoBitmapRep(*target, {}); });
 }
 
 TEST(Bitmap, EnlargesOnlyOntoTheWholeOfItsLike) {
@@ -156,14 +150,12 @@ TEST(Bitmap, EnlargesOnlyOntoTheWholeOfItsLike) {
                    {source, bitmap(4, 4, 0), {0, 0, 4, 4}},
                    {bitmap(2, 2, 3), bitmap(4, 4, 3), {0, 0, 4, 4}},
                    {source, Bitmap::imageRepWithPixels(4, 4, 24), {0, 0, 4, 4}}};
-    for (const auto& c : refused) {
-        const ScratchHome home;
-        EXPECT_FALSE(c.source->drawWithBilinearScalingIntoBitmapRep(*c.target, c.rect));
-        expectLogged("IntoBitmapRep:targetRect:]: invalid bitmap scale parameters: rect={{0, 0}, ");
-    }
-    const ScratchHome home;
-    EXPECT_FALSE(bitmap(1, 1)->drawWithBilinearScalingIntoBitmapRep(*bitmap(32768, 1), {0, 0, 32768, 1}));
-    expectLogged(": error scaling bitmap: rect={{0, 0}, {32768, 1}}, source=");
+    for (const auto& c : refused)
+        expectRefused("IntoBitmapRep:targetRect:]: invalid bitmap scale parameters: rect={{0, 0}, ",
+                      [&] { return c.source->drawWithBilinearScalingIntoBitmapRep(*c.target, c.rect); });
+    expectRefused(": error scaling bitmap: rect={{0, 0}, {32768, 1}}, source=", [] {
+        return bitmap(1, 1)->drawWithBilinearScalingIntoBitmapRep(*bitmap(32768, 1), {0, 0, 32768, 1});
+    });
 }
 
 /// Anything that is no bitmap: fills its rectangle.
@@ -183,27 +175,21 @@ TEST(Bitmap, DrawsIntoEveryLayout) {
     const auto premultiplied = bitmap(2, 2, 1, {128, 128, 0, 0});
     const Bytes red[] = {{128, 0, 0, 128}, {128, 128, 0, 0}, {255, 0, 0, 128}, {128, 255, 0, 0}};
     const Bytes before{7, 60, 50, 40}; // no premultiplied pixel, whatever the layout
-    for (KXBitmapFormat format = 0; format < 4; ++format)
-        for (const KXImageRep* source :
-             {static_cast<const KXImageRep*>(&halfRed), static_cast<const KXImageRep*>(icon.get()),
-              static_cast<const KXImageRep*>(premultiplied.get())})
-            for (const KXRect& rect : {KXRect{2, 1, 2, 2}, KXRect{1, 0, 3, 5}, KXRect{0, 0, 6, 6},
-                                       KXRect{-1, 4, 3, 9}, KXRect{9, 0, 2, 2}}) {
-                const auto target = bitmap(6, 6, format, before);
-                ASSERT_TRUE(source->drawIntoBitmapRep(*target, rect, Interpolation::high));
-                for (int y = 0; y < 6; ++y)
-                    for (int x = 0; x < 6; ++x) {
-                        const auto cx = static_cast<float>(x);
-                        const auto cy = static_cast<float>(5 - y);
-                        const bool inside =
-                            cx >= rect.x && cx < rect.maxX() && cy >= rect.y && cy < rect.maxY();
-                        const Bytes want = inside ? red[format] : before;
-                        const Bytes got = pixelAt(*target, x, y);
-                        for (std::size_t i = 0; i < 4; ++i)
-                            ASSERT_NEAR(got[i], want[i], inside ? 2 : 0)
-                                << "format " << format << " rect " << rect.x << " at " << x << ", " << y;
-                    }
+    const KXImageRep* const sources[] = {&halfRed, icon.get(), premultiplied.get()};
+    const KXRect rects[] = {{2, 1, 2, 2}, {1, 0, 3, 5}, {0, 0, 6, 6}, {-1, 4, 3, 9}, {9, 0, 2, 2}};
+    for (KXBitmapFormat round = 0; round < 4 * 3; ++round)
+        for (const KXRect& rect : rects) {
+            const KXBitmapFormat format = round % 4;
+            const auto target = bitmap(6, 6, format, before);
+            ASSERT_TRUE(sources[round / 4]->drawIntoBitmapRep(*target, rect, Interpolation::high));
+            for (int at = 0; at < 6 * 6 * 4; ++at) {
+                const int x = at / 4 % 6, y = at / 24, channel = at % 4;
+                const bool inside = KXQtRect(rect).contains(QPointF(x + 0.5, 5.5 - y));
+                ASSERT_NEAR(target->bitmapData()[at], (inside ? red[format] : before)[channel],
+                            inside ? 2 : 0)
+                    << "format " << format << " rect " << rect.x << " at " << x << ", " << y;
             }
+        }
 }
 
 TEST(Bitmap, FractionalRectanglesLeaveOtherPixelsAlone) {
@@ -230,9 +216,10 @@ TEST(Bitmap, DrawsOnRowsAtOddAddressesAndOverHugeRectangles) {
     for (const KXRect& rect : {KXRect{-1e30f, -1e30f, 2e30f, 2e30f}, KXRect{0, 0, 4e9f, 3},
                                KXRect{0, 0, 4e12f, 1}, KXRect{1, 1, 1e-30f, 2}})
         EXPECT_TRUE(source->drawIntoBitmapRep(*target, rect, Interpolation::high));
+    expectRefused("interpolation:]: Invalid target for drawing into: rect {{0, 0}, {0, 4}}, target ", [&] {
+        return source->drawIntoBitmapRep(*target, {0, 0, 0, 4}, Interpolation::high);
+    });
     const ScratchHome home;
-    EXPECT_FALSE(source->drawIntoBitmapRep(*target, {0, 0, 0, 4}, Interpolation::high));
-    expectLogged("interpolation:]: Invalid target for drawing into: rect {{0, 0}, {0, 4}}, target ");
     EXPECT_FALSE(Fill({0, 1}, Qt::white).drawIntoBitmapRep(*target, {0, 0, 4, 4}, Interpolation::high));
     EXPECT_FALSE(
         source->drawIntoBitmapRep(*Bitmap::imageRepWithPixels(4, 4, 24), {0, 0, 4, 4}, Interpolation::high));
@@ -251,20 +238,15 @@ TEST(Bitmap, GoesThroughTiffAndBack) {
         EXPECT_EQ(pixelAt(*copy, 1, 0), (Bytes{99, 50, 25, 128}));
         EXPECT_EQ(pixelAt(*copy, 4, 2), (Bytes{100, 50, 25, 128}));
         EXPECT_TRUE(copy->colorProfileMatchesBitmap(*original));
-        const QImage image = original->createCGImageRef();
-        EXPECT_EQ(image.size(), QSize(5, 3));
-        EXPECT_EQ(qAlpha(image.pixel(0, 0)), 128);
+        EXPECT_EQ(qAlpha(original->createCGImageRef().pixel(4, 2)), 128);
     }
     const auto opaque = Bitmap::imageRepWithPixels(2, 2, 24);
     opaque->bitmapData()[11] = 77;
     const auto copy = Bitmap::imageRepWithData(opaque->TIFFRepresentation());
     EXPECT_FALSE(copy->hasAlpha());
     EXPECT_EQ(copy->bitmapData()[11], 77);
-    EXPECT_FALSE(copy->colorProfileMatchesBitmap(*[&] {
-        auto other = bitmap(1, 1);
-        other->setColorSyncProfileData(SharedBytes::copyOf(profile, 3));
-        return other;
-    }()));
+    opaque->setColorSyncProfileData(SharedBytes::copyOf(profile, 3));
+    EXPECT_FALSE(copy->colorProfileMatchesBitmap(*opaque));
     const ScratchHome home;
     for (const std::size_t size : {0U, 7U, 100U})
         EXPECT_FALSE(Bitmap::imageRepWithData(opaque->TIFFRepresentation().slice(0, size))) << size;

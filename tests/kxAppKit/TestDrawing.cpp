@@ -9,12 +9,6 @@
 
 namespace {
 
-QImage canvas(int width, int height) {
-    QImage image(width, height, QImage::Format_ARGB32_Premultiplied);
-    image.fill(Qt::transparent);
-    return image;
-}
-
 std::vector<QPointF> pointsOf(const KXBezierPath& path) {
     std::vector<QPointF> points;
     for (int i = 0; i < path.path().elementCount(); ++i)
@@ -39,9 +33,7 @@ TEST(BezierPath, ArrowsPointAsTheyAreTold) {
 
 TEST(BezierPath, RoundRectangles) {
     const KXRect rect{10, 20, 30, 12};
-    const KXBezierPath sharp = KXBezierPath::bezierPathWithRoundRect(rect, 0);
-    EXPECT_EQ(sharp.bounds(), rect);
-    EXPECT_EQ(pointsOf(sharp).front(), QPointF(10, 20));
+    EXPECT_EQ(pointsOf(KXBezierPath::bezierPathWithRoundRect(rect, 0)).front(), QPointF(10, 20));
     const KXBezierPath round = KXBezierPath::bezierPathWithRoundRect(rect, 3);
     EXPECT_EQ(round.bounds(), rect);
     EXPECT_EQ(pointsOf(round)[0], QPointF(10, 23));
@@ -62,15 +54,15 @@ TEST(BezierPath, XSymbolIsTheDiagonalsOfItsSquare) {
 }
 
 TEST(BezierPath, StrokesInside) {
-    QImage image = canvas(12, 12);
+    QImage image(12, 12, QImage::Format_ARGB32_Premultiplied);
+    image.fill(Qt::transparent);
     QPainter painter(&image);
     KXBezierPath path = KXBezierPath::bezierPathWithRoundRect({2, 2, 8, 8}, 0);
     path.strokeInside(painter, Qt::black);
     for (int y = 0; y < 12; ++y)
         for (int x = 0; x < 12; ++x) {
-            const bool inside = x >= 2 && x < 10 && y >= 2 && y < 10;
-            const bool deep = x >= 3 && x < 9 && y >= 3 && y < 9;
-            ASSERT_EQ(qAlpha(image.pixel(x, y)), inside && !deep ? 255 : 0) << x << ", " << y;
+            const bool edge = QRect(2, 2, 8, 8).contains(x, y) && !QRect(3, 3, 6, 6).contains(x, y);
+            ASSERT_EQ(qAlpha(image.pixel(x, y)), edge ? 255 : 0) << x << ", " << y;
         }
     EXPECT_EQ(path.lineWidth(), 1);
     image.fill(Qt::transparent);
@@ -81,15 +73,13 @@ TEST(BezierPath, StrokesInside) {
 }
 
 TEST(BezierPath, GradientsFillTheBandAcrossTheWholeClip) {
-    QImage image = canvas(40, 64);
+    QImage image(40, 64, QImage::Format_ARGB32_Premultiplied);
+    image.fill(Qt::transparent);
     QPainter painter(&image);
     KXBezierPath::linearGradientFill(painter, {10, 20, 5, 30}, Qt::black, Qt::white);
-    for (int x : {0, 39}) {
-        EXPECT_EQ(qAlpha(image.pixel(x, 19)), 0);
-        EXPECT_EQ(qAlpha(image.pixel(x, 20)), 255);
-        EXPECT_EQ(qAlpha(image.pixel(x, 49)), 255);
-        EXPECT_EQ(qAlpha(image.pixel(x, 50)), 0);
-    }
+    for (int x : {0, 39})
+        for (const auto& [y, alpha] : {std::pair{19, 0}, {20, 255}, {49, 255}, {50, 0}})
+            EXPECT_EQ(qAlpha(image.pixel(x, y)), alpha) << x << ", " << y;
     EXPECT_LT(qRed(image.pixel(0, 20)), 12);
     EXPECT_GT(qRed(image.pixel(0, 49)), 243);
     image.fill(Qt::transparent);
@@ -113,7 +103,6 @@ TEST(Color, BordersFadeUnlessTheWindowIsActive) {
     window.requestActivate();
     QCoreApplication::processEvents();
     EXPECT_EQ(reds(&window), std::pair(64, 217));
-    EXPECT_EQ(KXColor::whiteWithAlpha(0.5f), QColor::fromRgbF(1, 1, 1, 0.5f));
     EXPECT_EQ(KXColor::blackWithAlpha(2), QColor(0, 0, 0));
 }
 

@@ -7,9 +7,8 @@
 
 namespace {
 
-constexpr float nan = std::numeric_limits<float>::quiet_NaN();
-constexpr float infinity = std::numeric_limits<float>::infinity();
-constexpr float denormal = std::numeric_limits<float>::denorm_min();
+using Limits = std::numeric_limits<float>;
+constexpr float nan = Limits::quiet_NaN(), infinity = Limits::infinity();
 
 TEST(Geometry, TellsValidFromInvalid) {
     for (const float bad : {nan, infinity, -infinity, 0.0f, -0.0f, -1.0f}) {
@@ -20,7 +19,7 @@ TEST(Geometry, TellsValidFromInvalid) {
         EXPECT_EQ(KXRectFittingAspect({0, 0, 1, 1}, bad), KXRect()) << bad;
         EXPECT_EQ(KXRectFillingAspect({0, 0, bad, 1}, 1), KXRect()) << bad;
     }
-    for (const float good : {denormal, 1.0f, std::numeric_limits<float>::max()})
+    for (const float good : {Limits::denorm_min(), 1.0f, Limits::max()})
         EXPECT_FALSE(KXLengthIsInvalid(good)) << good;
     EXPECT_FALSE(KXPointIsInvalid({0, -5}));
     EXPECT_TRUE(KXPointIsInvalid({nan, 0}));
@@ -55,7 +54,6 @@ TEST(Geometry, CombinesRectangles) {
     EXPECT_EQ(KXIntersectionRect({0, 0, 4, 4}, {4, 0, 4, 4}), KXRect());
     const KXRect rects[] = {{9, 9, 0, 3}, {1, 1, 2, 2}, {5, 0, 1, 1}};
     EXPECT_EQ(KXUnionOfRects(rects), (KXRect{1, 0, 5, 3}));
-    EXPECT_EQ(KXUnionOfRects({}), KXRect());
     EXPECT_EQ(KXStringFromRect({0.5f, -1, 20, 1e9f}), "{{0.5, -1}, {20, 1e+09}}");
     EXPECT_EQ(KXPixelCount(nan), 0);
     EXPECT_EQ(KXPixelCount(-infinity), std::numeric_limits<int>::min());
@@ -64,12 +62,10 @@ TEST(Geometry, CombinesRectangles) {
 
 TEST(AffineTransform, CarriesBoundsOntoTheFrame) {
     const auto plain = KXAffineTransform::transformFromBounds({0, 0, 10, 10}, {100, 100, 20, 40});
-    ASSERT_TRUE(plain);
-    EXPECT_EQ(plain->map(QPointF(10, 10)), QPointF(120, 140));
+    EXPECT_EQ(plain.value().map(QPointF(10, 10)), QPointF(120, 140));
     const auto kept = KXAffineTransform::transformConservingAspectFromBounds({0, 0, 10, 10}, {0, 0, 20, 40});
-    ASSERT_TRUE(kept);
-    EXPECT_EQ(kept->map(QPointF(5, 5)), QPointF(10, 20));
-    EXPECT_EQ(kept->map(QPointF(0, 0)), QPointF(0, 10));
+    EXPECT_EQ(kept.value().map(QPointF(5, 5)), QPointF(10, 20));
+    EXPECT_EQ(kept.value().map(QPointF(0, 0)), QPointF(0, 10));
     EXPECT_FALSE(KXAffineTransform::transformFromBounds({0, 0, 0, 10}, {0, 0, 1, 1}));
     EXPECT_FALSE(KXAffineTransform::transformFromBounds({0, 0, 1, 1}, {nan, 0, 1, 1}));
     EXPECT_FALSE(KXAffineTransform::transformConservingAspectFromBounds({0, 0, 1, 1}, {0, 0, -1, 1}));

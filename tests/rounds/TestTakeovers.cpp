@@ -1,8 +1,8 @@
 #include "tests/rounds/Worker.h"
 #include "tests/support/ScratchHome.h"
 
+#include <algorithm>
 #include <atomic>
-#include <gmock/gmock.h>
 #include <memory>
 #include <random>
 #include <vector>
@@ -20,42 +20,41 @@ const std::string name = "com.corvane.kxipc.server2";
 
 /// Takes the name as soon as it can be had, and keeps it. An owner who sees another's mark was robbed: once
 /// it is killed it never looks again, and without that it never gives the name up.
-void contend(const std::string& directory, const SharedMemory<State>& state) {
+void contend(const std::string& directory, State& state) {
     Program program(directory);
     std::unique_ptr<platform::LocalPort> port;
     while (!(port = program.system.ports().open(name)))
-        Pause(std::chrono::microseconds(200));
-    state->owner = getpid();
+        std::this_thread::sleep_for(std::chrono::microseconds(200));
+    state.owner = getpid();
     for (;;) {
-        if (state->owner != getpid()) ++state->doubles;
-        Pause(std::chrono::microseconds(20));
+        if (state.owner != getpid()) ++state.doubles;
+        std::this_thread::sleep_for(std::chrono::microseconds(20));
     }
 }
 
 void takeOver(int servers, int rounds) {
     const ScratchHome home;
-    const std::string directory = home.path() / "ports";
-    const SharedMemory<State> state;
-    const auto start = [&] { return std::make_unique<Worker>([&] { contend(directory, state); }); };
+    State& state = Shared<State>();
+    const auto start = [&] {
+        return std::make_unique<Worker>([&] { contend(home.path() / "ports", state); });
+    };
     std::vector<std::unique_ptr<Worker>> workers;
     for (int i = 0; i < servers; ++i)
         workers.push_back(start());
 
     std::mt19937 random(static_cast<unsigned>(servers));
-    std::vector<std::chrono::microseconds> times;
-    TimeUntil([&] { return state->owner != 0; });
+    TimeUntil([&] { return state.owner != 0; });
     for (int round = 0; round < rounds && !testing::Test::HasFailure(); ++round) {
-        Pause(std::chrono::microseconds(random() % 2000));
+        std::this_thread::sleep_for(std::chrono::microseconds(random() % 2000));
         const auto owner =
-            std::ranges::find(workers, state->owner.load(), [](const auto& worker) { return worker->pid(); });
+            std::ranges::find(workers, state.owner.load(), [](const auto& worker) { return worker->pid(); });
         ASSERT_NE(owner, workers.end());
         const auto killed = (*owner)->pid();
         kill(killed, SIGKILL);
-        times.push_back(TimeUntil([&] { return state->owner != killed; }));
+        TimeUntil([&] { return state.owner != killed; });
         *owner = start();
     }
-    EXPECT_EQ(state->doubles, 0);
-    Report((std::to_string(servers) + " servers, next owner").c_str(), std::move(times));
+    EXPECT_EQ(state.doubles, 0);
 }
 
 TEST(Takeovers, NeverLeadToTwoOwnersAndSoonToOne) {

@@ -1,37 +1,27 @@
 #pragma once
 
+#include "lib/ipc/KXIPCContext.h"
 #include "platform/linux/LinuxPorts.h"
 #include "platform/linux/PollMainLoop.h"
 #include "platform/linux/ProcProcessTable.h"
 
-#include <algorithm>
 #include <chrono>
 #include <csignal>
-#include <ctime>
 #include <functional>
 #include <gtest/gtest.h>
 #include <new>
 #include <sys/mman.h>
 #include <sys/prctl.h>
 #include <sys/wait.h>
+#include <thread>
 #include <unistd.h>
-#include <vector>
 
-/// What the processes of a test share: a plain structure of atomics.
+/// What the processes of a test share, until they end: a plain structure of atomics.
 template <class Contents>
-class SharedMemory {
-public:
-    SharedMemory()
-        : m_contents(new (mmap(nullptr, sizeof(Contents), PROT_READ | PROT_WRITE, MAP_SHARED | MAP_ANONYMOUS,
-                               -1, 0)) Contents) {}
-    ~SharedMemory() { munmap(m_contents, sizeof(Contents)); }
-    SharedMemory(const SharedMemory&) = delete;
-    SharedMemory& operator=(const SharedMemory&) = delete;
-    Contents* operator->() const { return m_contents; }
-
-private:
-    Contents* m_contents;
-};
+Contents& Shared() {
+    constexpr int access = PROT_READ | PROT_WRITE, kind = MAP_SHARED | MAP_ANONYMOUS;
+    return *new (mmap(nullptr, sizeof(Contents), access, kind, -1, 0)) Contents;
+}
 
 /// A process that works until it is killed. Started by a process of one thread.
 class Worker {
@@ -64,19 +54,15 @@ struct Program {
     platform::PollMainLoop loop{clock};
     platform::ProcProcessTable processes{loop, clock};
     platform::LinuxPorts system;
+    KXIPCContext context;
     explicit Program(const std::string& directory)
-        : system(loop, directory) {}
+        : system(loop, directory)
+        , context{system.ports(), system.notifications(), loop, processes, "com.corvane.test"} {}
 };
-
-inline void Pause(std::chrono::microseconds time) {
-    const timespec rest{time.count() / 1'000'000, time.count() % 1'000'000 * 1000};
-    nanosleep(&rest, nullptr);
-}
 
 /// How long it took until the condition held, as seen every tenth of a millisecond; gives up after ten
 /// seconds.
-template <class Condition>
-std::chrono::microseconds TimeUntil(const Condition& condition) {
+inline std::chrono::microseconds TimeUntil(const std::function<bool()>& condition) {
     using Clock = std::chrono::steady_clock;
     const auto start = Clock::now();
     while (!condition()) {
@@ -84,15 +70,7 @@ std::chrono::microseconds TimeUntil(const Condition& condition) {
             ADD_FAILURE() << "in vain for ten seconds";
             break;
         }
-        Pause(std::chrono::microseconds(100));
+        std::this_thread::sleep_for(std::chrono::microseconds(100));
     }
     return std::chrono::duration_cast<std::chrono::microseconds>(Clock::now() - start);
-}
-
-inline void Report(const char* what, std::vector<std::chrono::microseconds> times) {
-    if (times.empty()) return;
-    std::ranges::sort(times);
-    std::printf("%s: %zu times, median %.1f ms, worst %.1f ms\n", what, times.size(),
-                static_cast<double>(times[times.size() / 2].count()) / 1000,
-                static_cast<double>(times.back().count()) / 1000);
 }

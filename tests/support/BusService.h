@@ -28,18 +28,20 @@ public:
         g_dbus_connection_register_object(m_bus.get(), path, m_node->interfaces[0], &answers, this, nullptr,
                                           nullptr);
         g_main_context_pop_thread_default(m_context);
-        auto* reply = g_dbus_connection_call_sync(m_bus.get(), "org.freedesktop.DBus",
-                                                  "/org/freedesktop/DBus", "org.freedesktop.DBus",
-                                                  "RequestName", g_variant_new("(su)", name, 0u), nullptr,
-                                                  G_DBUS_CALL_FLAGS_NONE, -1, nullptr, nullptr);
-        g_variant_unref(reply);
-        m_thread = std::thread([this] { g_main_loop_run(m_loop); });
+        const char* bus = "org.freedesktop.DBus";
+        g_variant_unref(g_dbus_connection_call_sync(m_bus.get(), bus, "/org/freedesktop/DBus", bus,
+                                                    "RequestName", g_variant_new("(su)", name, 0u), nullptr,
+                                                    G_DBUS_CALL_FLAGS_NONE, -1, nullptr, nullptr));
+        m_thread = std::jthread([this](const std::stop_token& stop) {
+            while (!stop.stop_requested())
+                g_main_context_iteration(m_context, TRUE);
+        });
     }
     ~BusService() {
-        g_main_context_invoke(m_context, onQuit, m_loop);
+        m_thread.request_stop();
+        g_main_context_wakeup(m_context);
         m_thread.join();
         g_dbus_connection_close_sync(m_bus.get(), nullptr, nullptr);
-        g_main_loop_unref(m_loop);
         g_main_context_unref(m_context);
         g_dbus_node_info_unref(m_node);
     }
@@ -64,16 +66,11 @@ private:
         }
         g_dbus_method_invocation_return_value(call, nullptr);
     }
-    static gboolean onQuit(gpointer loop) {
-        g_main_loop_quit(static_cast<GMainLoop*>(loop));
-        return G_SOURCE_REMOVE;
-    }
 
     GDBusNodeInfo* m_node;
     GMainContext* m_context = g_main_context_new();
-    GMainLoop* m_loop = g_main_loop_new(m_context, FALSE);
     platform::GObjectPointer<GDBusConnection> m_bus;
-    std::thread m_thread;
+    std::jthread m_thread;
     std::mutex m_mutex;
     std::vector<std::string> m_calls;
 };

@@ -6,13 +6,9 @@
 #include <algorithm>
 #include <vector>
 
-class InMemoryNotificationCenter;
-
 /// What the processes of a test share. Main thread only.
-class InMemoryNotificationNetwork {
-private:
-    friend class InMemoryNotificationCenter;
-    std::vector<InMemoryNotificationCenter*> m_centers;
+struct InMemoryNotificationNetwork {
+    std::vector<platform::DistributedNotificationCenter*> centers;
 };
 
 /// The notification centre of one process of a test.
@@ -22,12 +18,12 @@ public:
     InMemoryNotificationCenter(InMemoryNotificationNetwork& network, platform::MainLoop& mainLoop)
         : m_network(network)
         , m_mainLoop(mainLoop) {
-        m_network.m_centers.push_back(this);
+        m_network.centers.push_back(this);
     }
-    ~InMemoryNotificationCenter() override { std::erase(m_network.m_centers, this); }
+    ~InMemoryNotificationCenter() override { std::erase(m_network.centers, this); }
 
     void post(const std::string& name) override {
-        for (auto* center : m_network.m_centers)
+        for (auto* center : m_network.centers)
             center->postLocally(name);
     }
 

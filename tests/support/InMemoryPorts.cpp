@@ -1,125 +1,96 @@
 #include "tests/support/InMemoryPorts.h"
 
-#include <algorithm>
+#include <ranges>
 
 using namespace platform;
 
-struct InMemoryPortNetwork::Waiter {
-    std::optional<SendStatus> outcome;
-};
+/// Where a synchronous sender finds how it went.
+using Outcome = std::shared_ptr<std::optional<SendStatus>>;
 
 struct InMemoryPortNetwork::Mailbox {
-    struct Letter {
-        Arrival arrival;
-        std::shared_ptr<Waiter> waiter;
-    };
-    std::deque<Letter> letters;
+    std::vector<Arrival> letters;
     bool closed = false;
     std::vector<std::function<void()>> hangUps; ///< one for every process that is connected
 };
+using Mailbox = std::shared_ptr<InMemoryPortNetwork::Mailbox>;
 
-class InMemoryReceipt final : public Receipt {
-public:
-    InMemoryReceipt(InMemoryPortNetwork& network, std::shared_ptr<InMemoryPortNetwork::Waiter> waiter)
-        : m_network(network)
-        , m_waiter(std::move(waiter)) {}
+struct InMemoryReceipt final : Receipt {
+    InMemoryReceipt(InMemoryPortNetwork& ours, Outcome senders)
+        : network(ours)
+        , outcome(std::move(senders)) {}
     ~InMemoryReceipt() override {
-        if (!m_waiter) return;
-        std::lock_guard lock(m_network.m_mutex);
-        if (!m_waiter->outcome) m_waiter->outcome = SendStatus::success;
-        m_network.m_changed.notify_all();
+        if (!outcome) return;
+        const std::lock_guard lock(network.mutex);
+        *outcome = status;
+        network.changed.notify_all();
     }
 
-private:
-    InMemoryPortNetwork& m_network;
-    std::shared_ptr<InMemoryPortNetwork::Waiter> m_waiter;
+    InMemoryPortNetwork& network;
+    Outcome outcome; ///< none: nobody waits
+    SendStatus status = SendStatus::success;
 };
 
-class InMemoryLocalPort final : public LocalPort {
-public:
-    InMemoryLocalPort(InMemoryPortNetwork& network, std::string name)
-        : m_network(network)
-        , m_name(std::move(name)) {}
+struct InMemoryLocalPort final : LocalPort {
+    explicit InMemoryLocalPort(InMemoryPortNetwork& ours)
+        : network(ours) {}
     ~InMemoryLocalPort() override { close(); }
 
-    bool take() {
-        std::lock_guard lock(m_network.m_mutex);
-        return m_network.m_owners.try_emplace(m_name, m_mailbox).second;
-    }
-
     void run(const Receiver& receiver) override {
-        std::unique_lock lock(m_network.m_mutex);
+        std::unique_lock lock(network.mutex);
         for (;;) {
-            m_network.m_changed.wait(lock, [&] { return m_mailbox->closed || !m_mailbox->letters.empty(); });
-            if (m_mailbox->closed) return;
-            auto letter = std::move(m_mailbox->letters.front());
-            m_mailbox->letters.pop_front();
+            network.changed.wait(lock, [&] { return mailbox->closed || !mailbox->letters.empty(); });
+            if (mailbox->closed) return;
+            auto letters = std::exchange(mailbox->letters, {});
             lock.unlock();
-            letter.waiter.reset();
-            std::vector<Arrival> arrivals;
-            arrivals.push_back(std::move(letter.arrival));
-            receiver(std::move(arrivals));
+            receiver(std::move(letters));
             lock.lock();
         }
     }
 
     void close() override {
-        std::deque<InMemoryPortNetwork::Mailbox::Letter> dropped; // ends after the lock
-        std::vector<std::function<void()>> hangUps;
-        {
-            std::lock_guard lock(m_network.m_mutex);
-            if (std::exchange(m_mailbox->closed, true)) return;
-            const auto owner = m_network.m_owners.find(m_name);
-            if (owner != m_network.m_owners.end() && owner->second == m_mailbox)
-                m_network.m_owners.erase(owner);
-            dropped.swap(m_mailbox->letters);
-            hangUps.swap(m_mailbox->hangUps);
-            for (auto& letter : dropped) {
-                if (letter.waiter) letter.waiter->outcome = SendStatus::becameInvalid;
-            }
-            m_network.m_changed.notify_all();
-        }
-        for (auto& hangUp : hangUps)
+        std::unique_lock lock(network.mutex);
+        if (std::exchange(mailbox->closed, true)) return;
+        std::erase_if(network.owners, [&](const auto& owner) { return owner.second == mailbox; });
+        const auto dropped = std::exchange(mailbox->letters, {});
+        const auto hangUps = std::exchange(mailbox->hangUps, {});
+        network.changed.notify_all();
+        lock.unlock(); // before what was dropped answers
+        for (const auto& letter : dropped)
+            static_cast<InMemoryReceipt&>(*letter.receipt).status = SendStatus::becameInvalid;
+        for (const auto& hangUp : hangUps)
             hangUp();
     }
 
-private:
-    InMemoryPortNetwork& m_network;
-    std::string m_name;
-    std::shared_ptr<InMemoryPortNetwork::Mailbox> m_mailbox =
-        std::make_shared<InMemoryPortNetwork::Mailbox>();
+    InMemoryPortNetwork& network;
+    const Mailbox mailbox = std::make_shared<InMemoryPortNetwork::Mailbox>();
 };
 
-class InMemoryRemotePort final : public RemotePort {
-public:
-    InMemoryRemotePort(InMemoryPortNetwork& network, std::shared_ptr<InMemoryPortNetwork::Mailbox> mailbox,
-                       PortPeer self)
-        : m_network(network)
-        , m_mailbox(std::move(mailbox))
-        , m_self(self) {}
+struct InMemoryRemotePort final : RemotePort {
+    InMemoryRemotePort(InMemoryPortNetwork& ours, Mailbox of, PortPeer from)
+        : network(ours)
+        , mailbox(std::move(of))
+        , self(from) {}
 
     SendStatus send(std::span<const std::span<const std::byte>> pieces, bool synchronous,
                     Timeouts timeouts) override {
         std::vector<std::byte> joined;
         for (const auto piece : pieces)
             joined.insert(joined.end(), piece.begin(), piece.end());
-        const auto waiter = synchronous ? std::make_shared<InMemoryPortNetwork::Waiter>() : nullptr;
+        const auto outcome = synchronous ? std::make_shared<Outcome::element_type>() : nullptr;
 
-        std::unique_lock lock(m_network.m_mutex);
-        if (m_mailbox->closed) return SendStatus::isInvalid;
-        m_mailbox->letters.push_back({{SharedBytes::copyOf(joined.data(), joined.size()), m_self,
-                                       std::make_unique<InMemoryReceipt>(m_network, waiter)},
-                                      waiter});
-        m_network.m_changed.notify_all();
+        std::unique_lock lock(network.mutex);
+        if (mailbox->closed) return SendStatus::isInvalid;
+        mailbox->letters.push_back({SharedBytes::copyOf(joined.data(), joined.size()), self,
+                                    std::make_unique<InMemoryReceipt>(network, outcome)});
+        network.changed.notify_all();
         if (!synchronous) return SendStatus::success;
-        m_network.m_changed.wait_for(lock, timeouts.receive, [&] { return waiter->outcome.has_value(); });
-        return waiter->outcome.value_or(SendStatus::receiveTimeout);
+        network.changed.wait_for(lock, timeouts.receive, [&] { return outcome->has_value(); });
+        return outcome->value_or(SendStatus::receiveTimeout);
     }
 
-private:
-    InMemoryPortNetwork& m_network;
-    std::shared_ptr<InMemoryPortNetwork::Mailbox> m_mailbox;
-    PortPeer m_self;
+    InMemoryPortNetwork& network;
+    Mailbox mailbox;
+    PortPeer self;
 };
 
 InMemoryPorts::InMemoryPorts(InMemoryPortNetwork& network, MainLoop& mainLoop, PortPeer self)
@@ -127,19 +98,18 @@ InMemoryPorts::InMemoryPorts(InMemoryPortNetwork& network, MainLoop& mainLoop, P
     , m_mainLoop(mainLoop)
     , m_self(self) {}
 
-InMemoryPorts::~InMemoryPorts() = default;
-
 std::unique_ptr<LocalPort> InMemoryPorts::open(const std::string& name) {
-    auto port = std::make_unique<InMemoryLocalPort>(m_network, name);
-    if (!port->take()) return nullptr;
+    auto port = std::make_unique<InMemoryLocalPort>(m_network);
+    const std::lock_guard lock(m_network.mutex); // ends before a port that is not to be
+    if (!m_network.owners.try_emplace(name, port->mailbox).second) return nullptr;
     return port;
 }
 
 std::unique_ptr<RemotePort> InMemoryPorts::connect(const std::string& name) {
     noticeHangUp(name);
-    std::lock_guard lock(m_network.m_mutex);
-    const auto owner = m_network.m_owners.find(name);
-    if (owner == m_network.m_owners.end()) {
+    const std::lock_guard lock(m_network.mutex);
+    const auto owner = m_network.owners.find(name);
+    if (owner == m_network.owners.end()) {
         if (m_believed.erase(name) > 0) {
             m_ended.insert(name);
             postHangUp(name);
@@ -158,25 +128,19 @@ std::unique_ptr<RemotePort> InMemoryPorts::connect(const std::string& name) {
 bool InMemoryPorts::isListening(const std::string& name) {
     noticeHangUp(name);
     if (m_ended.erase(name) > 0) return false;
-    std::lock_guard lock(m_network.m_mutex);
-    const bool listening = m_network.m_owners.contains(name);
-    if (listening)
-        m_believed.insert(name);
-    else
-        m_believed.erase(name);
-    return listening;
+    const std::lock_guard lock(m_network.mutex);
+    m_believed.erase(name);
+    return m_network.owners.contains(name) && m_believed.insert(name).second;
 }
 
 std::vector<std::string> InMemoryPorts::listeningNames() {
-    std::lock_guard lock(m_network.m_mutex);
-    std::vector<std::string> names;
-    for (const auto& owner : m_network.m_owners)
-        names.push_back(owner.first);
-    return names;
+    const std::lock_guard lock(m_network.mutex);
+    const auto names = std::views::keys(m_network.owners);
+    return {names.begin(), names.end()};
 }
 
 void InMemoryPorts::noticeHangUp(const std::string& name) {
-    std::lock_guard lock(m_network.m_mutex);
+    const std::lock_guard lock(m_network.mutex);
     const auto connected = m_connected.find(name);
     if (connected == m_connected.end() || !connected->second->closed) return;
     m_connected.erase(connected);
@@ -185,10 +149,10 @@ void InMemoryPorts::noticeHangUp(const std::string& name) {
 
 /// Any thread.
 void InMemoryPorts::postHangUp(const std::string& name) {
-    m_mainLoop.post([name, weak = std::weak_ptr(m_alive)] {
-        const auto self = weak.lock();
-        if (!self) return;
-        (*self)->noticeHangUp(name);
-        if ((*self)->m_hangUpHandler) (*self)->m_hangUpHandler(name);
+    m_mainLoop.post([this, name, weak = std::weak_ptr(m_alive)] {
+        const auto alive = weak.lock();
+        if (!alive) return;
+        noticeHangUp(name);
+        if (m_hangUpHandler) m_hangUpHandler(name);
     });
 }

@@ -4,25 +4,16 @@
 #include "platform/MessagePort.h"
 
 #include <condition_variable>
-#include <deque>
 #include <map>
 #include <mutex>
 #include <set>
 
-/// What the processes of a test share: the names and their owners. Any thread.
-class InMemoryPortNetwork {
-public:
-    struct Waiter; ///< a synchronous sender
+/// What the processes of a test share: the names and their owners. Any thread, under the mutex.
+struct InMemoryPortNetwork {
     struct Mailbox;
-
-private:
-    friend class InMemoryPorts;
-    friend class InMemoryLocalPort;
-    friend class InMemoryRemotePort;
-    friend class InMemoryReceipt;
-    std::mutex m_mutex;
-    std::condition_variable m_changed;
-    std::map<std::string, std::shared_ptr<Mailbox>> m_owners;
+    std::mutex mutex;
+    std::condition_variable changed;
+    std::map<std::string, std::shared_ptr<Mailbox>> owners;
 };
 
 /// The ports of one process of a test. A port that is closed or destroyed is one whose owner has ended.
@@ -30,7 +21,6 @@ class InMemoryPorts final : public platform::MessagePorts {
 public:
     /// All must outlive it, but for what is still posted to the loop.
     InMemoryPorts(InMemoryPortNetwork& network, platform::MainLoop& mainLoop, platform::PortPeer self);
-    ~InMemoryPorts() override;
 
     std::unique_ptr<platform::LocalPort> open(const std::string& name) override;
     std::unique_ptr<platform::RemotePort> connect(const std::string& name) override;
@@ -49,5 +39,5 @@ private:
     std::map<std::string, std::shared_ptr<InMemoryPortNetwork::Mailbox>> m_connected;
     std::set<std::string> m_believed; ///< names whose owner somebody was told of
     std::set<std::string> m_ended;    ///< those whose owner has ended since
-    std::shared_ptr<InMemoryPorts*> m_alive = std::make_shared<InMemoryPorts*>(this);
+    std::shared_ptr<bool> m_alive = std::make_shared<bool>();
 };

@@ -1,18 +1,13 @@
 #pragma once
 
-#include <cstdlib>
-#include <filesystem>
-#include <fstream>
-#include <string>
+#include "tests/support/ScratchHome.h"
+
 #include <utility>
 
 /// A computer of the test program's own. GLib reads where things lie once, so it stands before all else.
 struct ScratchComputer {
     ScratchComputer() {
-        std::string path = std::filesystem::temp_directory_path() / "kx-host-XXXXXX";
-        root = mkdtemp(path.data());
         const std::pair<const char*, std::string> variables[] = {
-            {"HOME", root},
             {"XDG_DATA_HOME", root / "data"},
             {"XDG_DATA_DIRS", root / "system"},
             {"XDG_CONFIG_HOME", root / "config"},
@@ -28,9 +23,6 @@ struct ScratchComputer {
         write("config/user-dirs.dirs",
               "XDG_DOCUMENTS_DIR=\"$HOME/Dokumente\"\nXDG_MUSIC_DIR=\"$HOME/gone\"\n");
     }
-    ~ScratchComputer() { std::filesystem::remove_all(root); }
-    ScratchComputer(const ScratchComputer&) = delete;
-    ScratchComputer& operator=(const ScratchComputer&) = delete;
 
     std::filesystem::path write(const std::filesystem::path& path, const std::string& text) const {
         std::filesystem::create_directories((root / path).parent_path());
@@ -46,7 +38,8 @@ struct ScratchComputer {
         return write("data/applications/" + id + ".desktop", head + keys);
     }
 
-    std::filesystem::path root;
+    const ScratchHome home;
+    const std::filesystem::path root = home.path();
 };
 
 inline const ScratchComputer computer;

@@ -37,7 +37,6 @@ public:
     tessel::IconSets icons{{"red", plist::Array{1}}};
     std::optional<std::string> failure; ///< of launching
     int readings = 0;
-    std::vector<std::string> iconsAsked;
-    std::vector<std::string> launched;
+    std::vector<std::string> iconsAsked, launched;
     std::function<void()> changed;
 };

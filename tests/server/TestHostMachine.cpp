@@ -3,17 +3,14 @@
 #include "platform/linux/GioLaunchServices.h"
 #include "server/linux/HostCatalogue.h"
 #include "server/linux/SpawnedPrograms.h"
+#include "tests/support/GuiApplication.h"
 #include "tests/support/ScratchComputer.h"
 
-#include <QGuiApplication>
 #include <QImage>
 
 #include <gio/gio.h>
 #include <gmock/gmock.h>
 
-#include <cstdlib>
-#include <filesystem>
-#include <fstream>
 #include <future>
 
 using namespace tessel;
@@ -21,14 +18,7 @@ using testing::ElementsAre;
 
 namespace {
 
-namespace fs = std::filesystem;
-
 platform::GioLaunchServices launching;
-
-void runUntil(const std::function<bool()>& condition) {
-    while (!condition())
-        g_main_context_iteration(nullptr, TRUE);
-}
 
 std::string titles(const std::vector<CatalogueItem>& items) {
     std::string result;
@@ -64,10 +54,7 @@ TEST(HostMachine, ListsWhatThisDesktopShouldShow) {
 }
 
 TEST(HostMachine, ReadsIconsOfTheThemeOnAThreadOfItsOwn) {
-    int count = 1;
-    char name[] = "test";
-    char* arguments[] = {name, nullptr};
-    const QGuiApplication application(count, arguments);
+    ensureGuiApplication();
     computer.write("config/gtk-3.0/settings.ini", "[Settings]\ngtk-icon-theme-name=KXTheme\n");
     computer.write("data/icons/KXTheme/index.theme", "[Icon Theme]\nName=x\nDirectories=s\n"
                                                      "[s]\nSize=48\nMinSize=1\nMaxSize=256\nType=Scalable\n");
@@ -91,14 +78,18 @@ TEST(HostMachine, ReadsIconsOfTheThemeOnAThreadOfItsOwn) {
     }).get();
 }
 
-TEST(HostMachine, LaunchesThroughTheDesktopEntryAndSaysWhyNot) {
+TEST(HostMachine, TellsOfANewEntryAndLaunchesItOrSaysWhyNot) {
     HostMachine machine("host", "This", launching);
+    bool isChanged = false;
+    const auto watch = machine.watch([&] { isChanged = true; });
+    machine.readCatalogue();
     computer.install("kx-true", "NoDisplay=true\n");
     computer.install("kx-broken", "NoDisplay=true\nExec=/no/such/program\n");
     const auto launch = [&](const std::string& id) {
         std::optional<std::string> result;
         machine.launch({.id = id}, [&](const auto& failure) { result = failure.value_or("started"); });
-        runUntil([&] { return result.has_value(); });
+        while (!result)
+            g_main_context_iteration(nullptr, TRUE);
         return *result;
     };
     // The library learns of a new entry from a thread that watches the folder.
@@ -107,18 +98,11 @@ TEST(HostMachine, LaunchesThroughTheDesktopEntryAndSaysWhyNot) {
         outcome = launch("kx-true.desktop");
     while (outcome == "its desktop entry is gone");
     EXPECT_EQ(outcome, "started");
+    while (!isChanged)
+        g_main_context_iteration(nullptr, TRUE);
     EXPECT_EQ(launch("kx-gone.desktop"), "its desktop entry is gone");
     EXPECT_NE(launch("kx-broken.desktop"), "started");
     EXPECT_NE(launch("place:kx-unknown://x"), "started");
-}
-
-TEST(HostMachine, TellsWhenAnEntryComes) {
-    HostMachine machine("host", "This", launching);
-    bool isChanged = false;
-    const auto watch = machine.watch([&] { isChanged = true; });
-    machine.readCatalogue();
-    computer.install("kx-new", "NoDisplay=true\n");
-    runUntil([&] { return isChanged; });
 }
 
 TEST(SpawnedPrograms, StartsAndReaps) {

@@ -11,21 +11,18 @@ CatalogueItem application(const std::string& id, const std::string& icon = "") {
     return {.id = id, .title = "The " + id, .icon = icon};
 }
 
+CatalogueItem folder(const std::string& name, std::vector<CatalogueItem> children) {
+    return {.kind = ItemKind::folder, .id = name, .title = name, .children = std::move(children)};
+}
+
 Catalogue smallCatalogue() {
     CatalogueItem checked = application("checked", "own");
     checked.state = 2;
     checked.alternate = {application("other")};
     CatalogueItem disabled = application("disabled");
     disabled.enabled = false;
-    const CatalogueItem inner{.kind = ItemKind::folder,
-                              .id = "Inner",
-                              .title = "Inner",
-                              .children = {application("deep"), disabled}};
-    const CatalogueItem outer{.kind = ItemKind::folder,
-                              .id = "Outer",
-                              .title = "Outer",
-                              .hideTriangle = true,
-                              .children = {checked, inner}};
+    CatalogueItem outer = folder("Outer", {checked, folder("Inner", {application("deep"), disabled})});
+    outer.hideTriangle = true;
     return {.programs = {application("web", "unknown"), {.kind = ItemKind::separator}, outer},
             .topMenu = {{.kind = ItemKind::command, .id = "top/a/b", .title = "Command"}, application("web")},
             .bottomMenu = {},

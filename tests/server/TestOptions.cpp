@@ -15,12 +15,9 @@ TEST(Options, ReadsEveryOptionAndRefusesTheRest) {
     EXPECT_EQ(options->record + *options->machine, "filesample");
     EXPECT_EQ(options->select, 1u);
     EXPECT_TRUE(ParseOptions({}, error)->startAgent);
-    for (const std::vector<const char*>& bad : {std::vector{"--select", "-1"},
-                                                {"--select", "1x"},
-                                                {"--record"},
-                                                {"--record", ""},
-                                                {"--hel"},
-                                                {""}}) {
+    using Words = std::vector<const char*>;
+    for (const Words& bad : {Words{"--select", "-1"}, Words{"--select", "1x"}, Words{"--record"},
+                             Words{"--record", ""}, Words{"--hel"}, Words{""}}) {
         EXPECT_FALSE(ParseOptions(bad, error)) << bad.front();
         EXPECT_NE(error, "");
     }
@@ -28,20 +25,12 @@ TEST(Options, ReadsEveryOptionAndRefusesTheRest) {
 
 TEST(Record, WritesOneBoundedLineForEachMessage) {
     const ScratchHome home;
-    const std::string path = home.path() / "record";
-    Record record;
-    record.add("goes nowhere");
-    ASSERT_TRUE(record.open(path));
-    record.add("received", KXIPCMessage("menu.refresh", std::nullopt, nullptr));
-    const plist::Value rows = plist::Array{plist::Dictionary{{"title", "x"}}, plist::Dictionary{}};
-    record.add("sent", KXIPCMessage("menu.update", std::nullopt,
-                                    plist::Dictionary{{"menu", plist::Dictionary{{"topMenu", rows}}},
-                                                      {"nameList", plist::Array{"a", "b"}},
-                                                      {"selectedIndex", 1}}));
-    EXPECT_EQ(ScratchHome::contents(path), "menu.refresh received {}\n"
-                                           "menu.update sent {\"menu\": {\"topMenu\": 2}, \"nameList\": "
-                                           "[\"a\", \"b\"], \"selectedIndex\": 1}\n");
-
+    const plist::Value menu = plist::Dictionary{{"topMenu", plist::Array{plist::Dictionary{}, 1}}};
+    const plist::Dictionary update{
+        {"menu", menu}, {"nameList", plist::Array{"a", "b"}}, {"selectedIndex", 1}};
+    EXPECT_EQ(DigestLine("sent", KXIPCMessage("menu.update", std::nullopt, update)),
+              R"(menu.update sent {"menu": {"topMenu": 2}, "nameList": ["a", "b"], "selectedIndex": 1})");
+    EXPECT_EQ(DigestLine("received", KXIPCMessage("n", std::nullopt, nullptr)), "n received {}");
     plist::Value nested = plist::Array{};
     for (int i = 0; i < 400; ++i)
         nested =
@@ -50,5 +39,5 @@ TEST(Record, WritesOneBoundedLineForEachMessage) {
     EXPECT_LT(line.size(), 2000u);
     EXPECT_THAT(line, testing::HasSubstr("q\\\"\\u000a"));
     EXPECT_EQ(line.find('\n'), line.npos);
-    EXPECT_FALSE(record.open((home.path() / "no" / "where").string()));
+    EXPECT_FALSE(Record().open((home.path() / "no" / "where").string()));
 }

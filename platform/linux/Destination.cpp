@@ -12,10 +12,12 @@
 #include <cstddef>
 #include <cstdint>
 #include <fcntl.h>
+#include <linux/sockios.h>
 #include <memory>
 #include <mutex>
 #include <optional>
 #include <string>
+#include <sys/ioctl.h>
 #include <utility>
 
 namespace platform {
@@ -26,6 +28,8 @@ namespace {
 constexpr std::size_t maximalQueuedBytes = maximalPayload;
 constexpr std::size_t maximalQueuedMessages = 65536;
 constexpr std::size_t maximalQueuedDescriptors = 128;
+// The system bounds what is on its way by the size of packets, whatever is in memory behind them.
+constexpr std::size_t maximalOnTheWay = std::size_t{64} << 20;
 
 SendStatus StatusFrom(Sending sending) {
     switch (sending) {
@@ -153,20 +157,30 @@ Sending Destination::transmit(std::unique_lock<std::mutex>& lock, const Outgoing
             const auto opening = openConnection();
             if (opening != Sending::taken) return opening;
         }
+        if (packet.hasDescriptor() && !hasRoomOnTheWay(packet)) return Sending::exhausted;
         const auto socket = m_socket;
         lock.unlock();
         const auto sending = packet.send(socket->get());
         if (sending == Sending::taken) m_tap.didSend(packet, socket->get());
         lock.lock();
         if (sending == Sending::taken) takenBy = socket;
+        if (sending == Sending::taken && packet.hasDescriptor()) m_onTheWay += packet.size();
         if (sending != Sending::hungUp) return sending;
         if (m_socket == socket) endConnection();
     }
     return Sending::hungUp;
 }
 
+bool Destination::hasRoomOnTheWay(const OutgoingPacket& packet) {
+    if (m_onTheWay == 0 || m_onTheWay + packet.size() <= maximalOnTheWay) return true;
+    int unread = 0;
+    if (ioctl(m_socket->get(), SIOCOUTQ, &unread) == 0 && unread == 0) m_onTheWay = 0;
+    return m_onTheWay == 0;
+}
+
 void Destination::endConnection() {
     m_socket.reset();
+    m_onTheWay = 0;
     m_ended = true;
     m_delegate.didChangeConnection(m_name);
 }

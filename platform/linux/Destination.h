@@ -67,6 +67,7 @@ private:
     Sending openConnection();
     Sending transmit(std::unique_lock<std::mutex>& lock, const OutgoingPacket& packet, Socket& takenBy);
     void endConnection();
+    bool hasRoomOnTheWay(const OutgoingPacket& packet);
     void drainLocked();
     bool hasRoomFor(const OutgoingPacket& packet) const;
     std::shared_ptr<Waiting> enqueue(OutgoingPacket packet, Clock::Instant deadline);
@@ -94,6 +95,7 @@ private:
     mutable std::mutex m_mutex; ///< guards what follows; nothing that takes long is done with it
     std::condition_variable m_changed;
     Socket m_socket;
+    std::size_t m_onTheWay = 0;  ///< bytes in memory that the receiver may not have taken yet
     Queue m_queue;               ///< while it is empty, the main thread sends; else the flusher
     bool m_transmitting = false; ///< the first of the queue
     std::size_t m_queuedBytes = 0;

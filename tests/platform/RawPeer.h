@@ -94,6 +94,10 @@ inline std::vector<RawPacket> BadPackets() {
     constexpr auto inMemory = PacketHeader::inMemory;
     const auto sealed = Memory("payload", allSeals);
     const auto file = std::make_shared<Descriptor>(open("/proc/self/exe", O_RDONLY | O_CLOEXEC));
+    int pipeEnds[2];
+    EXPECT_EQ(pipe2(pipeEnds, O_CLOEXEC), 0);
+    const auto pipe = std::make_shared<Descriptor>(pipeEnds[0]);
+    const Descriptor otherEnd(pipeEnds[1]);
     constexpr auto terabyte = std::size_t{1} << 40;
     const auto sparse = Memory("", 0);
     EXPECT_EQ(ftruncate(sparse->get(), terabyte), 0);
@@ -110,6 +114,7 @@ inline std::vector<RawPacket> BadPackets() {
         {"a descriptor too many", RawHeader({.payloadLength = 7}) + "payload", {sealed}},
         {"payload in both places", memoryHeader + "payload", {sealed}},
         {"a file", memoryHeader, {file}},
+        {"a pipe", memoryHeader, {pipe}},
         {"empty memory", RawHeader({.flags = inMemory}), {Memory("", allSeals)}},
         {"memory too small", RawHeader({.flags = inMemory, .payloadLength = 8}), {sealed}},
         {"memory too large", RawHeader({.flags = inMemory, .payloadLength = 6}), {sealed}},

@@ -168,6 +168,12 @@ TEST_F(UnixPorts, cutOffPeersThatSendWhatIsNoPacket) {
     }
     EXPECT_TRUE(listener.arrivals().empty());
 
+    // Who says nothing holds up nobody, and costs no entry; half a header does.
+    RawPeer silent(directory, name), half(directory, name);
+    half.send({"half a header", RawHeader({}).substr(0, sizeof(PacketHeader) / 2)});
+    EXPECT_TRUE(half.isCutOff());
+    EXPECT_EQ(ScratchHome::logged("too short\n"), 1);
+
     RawPeer peer(directory, name);
     for (const auto& packet : good)
         peer.send(packet);
@@ -175,7 +181,10 @@ TEST_F(UnixPorts, cutOffPeersThatSendWhatIsNoPacket) {
     for (std::size_t i = 0; i < good.size(); ++i)
         EXPECT_EQ(listener.text(i), "payload");
     listener.arrivals().clear();
-    EXPECT_LE(OpenDescriptors(), descriptors + 2) << "the last peer's two ends";
+    EXPECT_EQ(ScratchHome::logged("IPC: "), entries + 1);
+    EXPECT_LE(OpenDescriptors(), descriptors + 5) << "peers' ends, one of them already closed";
+    listener.close();
+    EXPECT_TRUE(silent.isCutOff());
 }
 
 TEST_F(UnixPorts, takePacketsFromTheProcessThatConnectedAlone) {

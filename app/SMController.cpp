@@ -70,9 +70,20 @@ void SMController::applicationDidFinishLaunching() {
         this, SMWindowDidResignKeyNotification, nullptr, [this](const KXNotification& notification) {
             onMenuWindowDidResignKey(std::any_cast<const void*>(notification.object));
         });
+    using Milliseconds = platform::MainLoop::Milliseconds;
+    m_preparation =
+        m_services.mainLoop.startTimer(Milliseconds{0}, Milliseconds{0}, [this] { prepareForOpening(); });
+}
+
+void SMController::prepareForOpening() {
+    m_preparation.reset();
+    if (m_menuWindow) return;
+    isMainAppRunning(); // whatever the answer is: to be quick when a click asks
+    m_services.prepareMenuWindow(*this);
 }
 
 void SMController::applicationWillTerminate() {
+    m_preparation.reset();
     KXNotificationCenter::defaultCenter().removeObserver(this);
     if (m_menuProxy) m_menuProxy->disconnect();
     m_menuProxy.reset();

@@ -19,6 +19,8 @@ struct SMServices {
     platform::StatusBar& systemStatusBar;
     const KXWorkspace& sharedWorkspace;
     std::function<std::unique_ptr<KXIPCClient>()> makeClient;
+    /// Makes ready what `makeMenuWindow` would otherwise take several frames for.
+    std::function<void(SMMenuWindowOwner&)> prepareMenuWindow;
     std::function<std::unique_ptr<SMMenuWindow>(SMMenuWindowOwner&)> makeMenuWindow;
     /// What is typed until the handle ends waits for whoever has the keyboard then.
     std::function<std::unique_ptr<platform::Handle>()> holdTyping;
@@ -69,6 +71,7 @@ private:
     void onStartMenuConnectedToServer() override;
 
     void onMenuWindowDidResignKey(const void* window);
+    void prepareForOpening();
     bool isMainAppRunning() const;
     bool isMenuWindowVisible() const { return m_menuWindow && m_menuWindow->isVisible(); }
     void placeMenuWindow();
@@ -79,6 +82,7 @@ private:
     std::unique_ptr<SMStatusItemView> m_statusItemView;
     std::unique_ptr<platform::StatusItem> m_statusItem;
     std::unique_ptr<SMMenuProxy> m_menuProxy;
-    std::unique_ptr<SMMenuWindow> m_menuWindow; ///< null until the menu first opens
+    std::unique_ptr<SMMenuWindow> m_menuWindow;      ///< null until the menu first opens
+    std::unique_ptr<platform::Handle> m_preparation; ///< null while none is due
     MenuFontWarmer m_fontWarmer;
 };

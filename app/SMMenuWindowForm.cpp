@@ -58,6 +58,8 @@ class MenuWindowForm final : public SMMenuWindowOutlets {
 public:
     MenuWindowForm(const SMMenuWindowServices& services, std::function<KXRect()> statusItemFrame);
 
+    void paintUnseen();
+
     void setDelegate(SMMenuWindowEvents* delegate) override;
 
     bool isVisible() const override { return m_window->isVisible(); }
@@ -129,6 +131,11 @@ MenuWindowForm::MenuWindowForm(const SMMenuWindowServices& services, std::functi
         if (m_delegate) m_delegate->onVMListPopUpButton();
     });
     setFrame(frame());
+}
+
+void MenuWindowForm::paintUnseen() {
+    m_view.winId(); // makes the native window
+    m_view.grab();
 }
 
 void MenuWindowForm::setDelegate(SMMenuWindowEvents* delegate) {
@@ -221,17 +228,21 @@ void MenuWindowForm::didHighlightByKeyboard(const SMMenuButton& button) {
         if (host->list() && host->list()->isSuperviewOf(button)) ReportMenuFocus(*host, button);
 }
 
-} // namespace
-
-std::unique_ptr<SMMenuWindowOutlets> SMLoadMenuWindow(const SMMenuWindowServices& services,
-                                                      std::function<KXRect()> statusItemFrame) {
-    return std::make_unique<MenuWindowForm>(services, std::move(statusItemFrame));
+std::unique_ptr<MenuWindowForm> loadForm(const SMMenuWindowServices& services, SMMenuWindowOwner& owner) {
+    return std::make_unique<MenuWindowForm>(services, [&owner] { return owner.statusItemFrame(); });
 }
 
-std::unique_ptr<SMMenuWindow> SMMakeMenuWindow(SMMenuWindowOwner& owner,
-                                               const SMMenuWindowServices& services) {
-    auto outlets = SMLoadMenuWindow(services, [&owner] { return owner.statusItemFrame(); });
+} // namespace
+
+void SMMenuWindowMaker::prepare(SMMenuWindowOwner& owner) {
+    auto form = loadForm(m_services, owner);
+    form->paintUnseen();
+    m_prepared = std::move(form);
+}
+
+std::unique_ptr<SMMenuWindow> SMMenuWindowMaker::make(SMMenuWindowOwner& owner) {
+    if (!m_prepared) m_prepared = loadForm(m_services, owner);
     return std::make_unique<SMMenuWindowController>(
-        owner, SMMenuCollectionView::Services{services.clock, services.mainLoop, services.modifierKeys},
-        std::move(outlets));
+        owner, SMMenuCollectionView::Services{m_services.clock, m_services.mainLoop, m_services.modifierKeys},
+        std::move(m_prepared));
 }

@@ -20,10 +20,19 @@ struct SMMenuWindowServices {
     const platform::UserDefaults& userDefaults;
 };
 
-/// The panel as the interface file describes it, without a controller.
-std::unique_ptr<SMMenuWindowOutlets> SMLoadMenuWindow(const SMMenuWindowServices& services,
-                                                      std::function<KXRect()> statusItemFrame);
+/// Makes the menu window as the interface file describes it. Main thread only.
+class SMMenuWindowMaker {
+public:
+    explicit SMMenuWindowMaker(const SMMenuWindowServices& services)
+        : m_services(services) {}
 
-/// The menu window with its controller, hidden at first.
-std::unique_ptr<SMMenuWindow> SMMakeMenuWindow(SMMenuWindowOwner& owner,
-                                               const SMMenuWindowServices& services);
+    /// Loads the form of the next window and paints it once, unseen: without a controller, and without the
+    /// time that this takes in the click that opens the window.
+    void prepare(SMMenuWindowOwner& owner);
+    /// With its controller, hidden at first. The owner must outlive it.
+    std::unique_ptr<SMMenuWindow> make(SMMenuWindowOwner& owner);
+
+private:
+    SMMenuWindowServices m_services;
+    std::unique_ptr<SMMenuWindowOutlets> m_prepared;
+};

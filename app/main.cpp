@@ -123,14 +123,13 @@ private:
     platform::StripStatusBar m_strip;
     platform::FollowingStatusBar m_statusBar{m_mainLoop, {&m_tray, &m_notifierBar}, m_strip};
     platform::QtWindowServer m_windowServer;
-    SMMenuWindowServices m_windowServices{m_windowServer, m_clock, m_mainLoop, m_modifierKeys,
-                                          m_userDefaults};
+    SMMenuWindowMaker m_windowMaker{{m_windowServer, m_clock, m_mainLoop, m_modifierKeys, m_userDefaults}};
     SMController m_controller{{
         .systemStatusBar = m_statusBar,
         .sharedWorkspace = m_workspace,
         .makeClient = [this] { return std::make_unique<KXIPCClient>(m_ipc); },
-        .makeMenuWindow =
-            [this](SMMenuWindowOwner& owner) { return SMMakeMenuWindow(owner, m_windowServices); },
+        .prepareMenuWindow = [this](SMMenuWindowOwner& owner) { m_windowMaker.prepare(owner); },
+        .makeMenuWindow = [this](SMMenuWindowOwner& owner) { return m_windowMaker.make(owner); },
         .holdTyping = [] { return platform::XcbHoldTyping(); },
         .terminate = [this] { terminate(); },
         .mainLoop = m_mainLoop,

@@ -3,6 +3,7 @@
 #include "lib/base/Geometry.h"
 #include "lib/kxAppKit/KXBezierPath.h"
 #include "lib/kxAppKit/KXImage.h"
+#include "lib/kxAppKit/KXQtGeometry.h"
 #include "platform/UserDefaults.h"
 
 #include <QFontMetricsF>
@@ -26,10 +27,6 @@ constexpr MenuGradient gradients[2][2] = {
     {{{81, 112, 246}, {26, 67, 243}, 1}, {{106, 114, 122}, {85, 94, 105}, 1}},
     {{{72, 105, 246}, {30, 70, 243}, 0.95F}, {{107, 115, 123}, {88, 98, 108}, 0.95F}},
 };
-
-QRectF toQt(const KXRect& rect) {
-    return {rect.x, rect.y, rect.width, rect.height};
-}
 
 QColor grey(float white, float alpha) {
     return QColor::fromRgbF(white, white, white, alpha);
@@ -148,7 +145,7 @@ void MenuPainter::drawText(QPainter& painter, const std::string& text, const KXR
 }
 
 void MenuPainter::fillWhite(QPainter& painter, const KXRect& rect, float white, float alpha) const {
-    const QRectF area = rect.height == 1 ? MenuHairline(painter, toQt(rect)) : toQt(rect);
+    const QRectF area = rect.height == 1 ? MenuHairline(painter, KXQtRect(rect)) : KXQtRect(rect);
     painter.fillRect(area, grey(white, alpha));
 }
 
@@ -181,7 +178,7 @@ void MenuPainter::fillGradient(QPainter& painter, const KXRect& rect, MenuGradie
     // Line by line: a gradient of the toolkit's would be made anew, with its table, at every painting.
     const QTransform toDevice = painter.deviceTransform();
     const QTransform fromDevice = toDevice.inverted();
-    const QRectF device = toDevice.mapRect(toQt(rect));
+    const QRectF device = toDevice.mapRect(KXQtRect(rect));
     const int top = qRound(device.top());
     const int bottom = qRound(device.bottom());
     for (int y = top; y < bottom; ++y) {

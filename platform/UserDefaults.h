@@ -1,6 +1,6 @@
 #pragma once
 
-#include <string>
+#include <string_view>
 
 namespace platform {
 
@@ -9,7 +9,7 @@ class UserDefaults {
 public:
     virtual ~UserDefaults() = default;
     /// Of the global domain; 0 when absent or no number.
-    virtual int integerForKey(const std::string& key) const = 0;
+    virtual int integerForKey(std::string_view key) const = 0;
 };
 
 } // namespace platform

@@ -2,11 +2,11 @@
 
 #include "platform/linux/WindowChoice.h"
 
-#include <string>
+#include <string_view>
 
 namespace platform {
 
-int DockDefaults::integerForKey(const std::string& key) const {
+int DockDefaults::integerForKey(std::string_view key) const {
     if (m_file.holds("workspaces") || !key.starts_with("workspaces")) return m_file.integerForKey(key);
     const DesktopGrid grid = m_desktops().value_or(DesktopGrid{});
     if (key == "workspaces-cols") return static_cast<int>(grid.columns);

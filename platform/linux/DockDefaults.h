@@ -20,7 +20,7 @@ public:
     explicit DockDefaults(Desktops desktops)
         : m_desktops(std::move(desktops)) {}
 
-    int integerForKey(const std::string& key) const override;
+    int integerForKey(std::string_view key) const override;
 
 private:
     PlistUserDefaults m_file{"com.apple.dock"};

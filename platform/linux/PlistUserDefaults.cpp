@@ -10,6 +10,7 @@
 #include <ios>
 #include <iterator>
 #include <string>
+#include <string_view>
 #include <system_error>
 
 namespace platform {
@@ -21,11 +22,11 @@ PlistUserDefaults::PlistUserDefaults(const std::string& domain) {
     m_path = fs::path(home ? home : "/") / "Library/Preferences" / (domain + ".plist");
 }
 
-int PlistUserDefaults::integerForKey(const std::string& key) const {
+int PlistUserDefaults::integerForKey(std::string_view key) const {
     return values()[key].intValue();
 }
 
-bool PlistUserDefaults::holds(const std::string& key) const {
+bool PlistUserDefaults::holds(std::string_view key) const {
     return !values()[key].isNil();
 }
 

@@ -6,6 +6,7 @@
 #include <cstdint>
 #include <filesystem>
 #include <string>
+#include <string_view>
 
 namespace platform {
 
@@ -16,8 +17,8 @@ public:
     /// Of the domain: ~/Library/Preferences/<domain>.plist.
     explicit PlistUserDefaults(const std::string& domain = ".GlobalPreferences");
 
-    int integerForKey(const std::string& key) const override;
-    bool holds(const std::string& key) const;
+    int integerForKey(std::string_view key) const override;
+    bool holds(std::string_view key) const;
 
 private:
     const plist::Value& values() const;

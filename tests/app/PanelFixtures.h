@@ -18,7 +18,7 @@ struct PanelWorld {
     }
     void makeWindow(platform::WindowServer& server) {
         window = nullptr; // so that there is never more than one
-        window = SMMakeMenuWindow(owner, {server, loop.clock(), loop, keys, defaults});
+        window = SMMenuWindowMaker({server, loop.clock(), loop, keys, defaults}).make(owner);
         owner.window = window.get();
         for (QWidget* panel : QApplication::topLevelWidgets())
             if (panel->objectName() == "menuWindow") view = panel;

@@ -111,6 +111,7 @@ protected:
     void launch() {
         controller.applicationWillFinishLaunching();
         controller.applicationDidFinishLaunching();
+        mainLoop.advance({});
         record.clear();
     }
     /// What has happened since the last question.
@@ -139,6 +140,7 @@ protected:
                 client = made.get();
                 return made;
             },
+        .prepareMenuWindow = [this](SMMenuWindowOwner&) { record.emplace_back("prepare"); },
         .makeMenuWindow =
             [this](SMMenuWindowOwner&) {
                 auto made = std::make_unique<FakeMenuWindow>(record);
@@ -161,6 +163,8 @@ TEST_F(Controller, StartsAndEndsInOrder) {
     controller.applicationWillFinishLaunching();
     controller.applicationDidFinishLaunching();
     EXPECT_THAT(happened(), ElementsAre("allow", "add item 30"));
+    mainLoop.advance({});
+    EXPECT_THAT(happened(), ElementsAre("prepare")) << "not while starting, nor in a click";
     controller.onStatusItemClicked();
     record.clear();
     controller.applicationWillTerminate();

@@ -33,8 +33,8 @@ struct InMemoryDesktop {
 
     struct Defaults final : platform::UserDefaults {
         std::map<std::string, int> values;
-        int integerForKey(const std::string& key) const override {
-            const auto found = values.find(key);
+        int integerForKey(std::string_view key) const override {
+            const auto found = values.find(std::string(key));
             return found == values.end() ? 0 : found->second;
         }
     } dock;

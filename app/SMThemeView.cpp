@@ -28,7 +28,7 @@ constexpr QRgb plainBackground = qRgb(236, 237, 240);
 SMThemeView::SMThemeView(QWidget* parent)
     : SMMenuHostWidget(parent) {
     setMouseTracking(true);
-    setAttribute(Qt::WA_OpaquePaintEvent); // the corners too, which it paints see-through
+    setAttribute(Qt::WA_OpaquePaintEvent); // the corners too: see-through, or cut off
 }
 
 void SMThemeView::setPanes(const Panes& panes) {
@@ -69,9 +69,11 @@ void SMThemeView::paintEvent(QPaintEvent*) {
         m_chromeVariant = variant;
         m_chrome.invalidate();
     }
+    // Where nothing shows through, a picture without an alpha channel: copying it is quick.
+    const QColor background = testAttribute(Qt::WA_TranslucentBackground) ? Qt::transparent : Qt::black;
     QPainter painter(this);
-    painter.setCompositionMode(QPainter::CompositionMode_Source);
-    m_chrome.draw(painter, *this, [this](QPainter& onPicture) { drawChrome(onPicture); });
+    m_chrome.draw(
+        painter, *this, [this](QPainter& onPicture) { drawChrome(onPicture); }, background);
 }
 
 void SMThemeView::drawChrome(QPainter& painter) const {
@@ -79,10 +81,7 @@ void SMThemeView::drawChrome(QPainter& painter) const {
     painter.setRenderHint(QPainter::Antialiasing);
     painter.setClipPath(path);
     if (!testAttribute(Qt::WA_TranslucentBackground)) painter.fillRect(rect(), QColor(plainBackground));
-    if (!m_backgroundImage.isNull()) {
-        painter.setRenderHint(QPainter::SmoothPixmapTransform);
-        painter.drawImage(rect(), m_backgroundImage);
-    }
+    painter.drawImage(QPoint(), m_backgroundImage);
 
     const float washHeight = static_cast<float>(height()) - m_panes.top.height;
     tools().fillWhite(painter, {0, m_panes.top.height, static_cast<float>(width()), washHeight}, 0.9F, 0.4F);

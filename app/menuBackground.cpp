@@ -23,10 +23,10 @@ Pixel toPixel(QRgb rgb) {
                             static_cast<float>(qRed(rgb)), 255}};
 }
 
-QRgb toRgb(const Pixel& pixel) {
-    const Pixel::Channels rounded = pixel.channels + 0.5F;
-    const auto level = [&](int i) { return static_cast<int>(rounded[i]); };
-    return qRgb(level(2), level(1), level(0));
+QRgb toRgb(Pixel::Channels channels) {
+    using Levels = int __attribute__((vector_size(16)));
+    const auto levels = __builtin_convertvector(channels + 0.5F, Levels);
+    return qRgb(levels[2], levels[1], levels[0]);
 }
 
 /// A moving average whose outermost pixels count for less than the others, so that it has any variance.
@@ -81,7 +81,7 @@ QImage blurredAndTransposed(const QImage& image, const Box& box) {
             line.swap(next);
         }
         for (std::size_t x = 0; x < width; ++x)
-            pixels[x * stride + static_cast<std::size_t>(y)] = toRgb(line[x]);
+            pixels[x * stride + static_cast<std::size_t>(y)] = toRgb(line[x].channels);
     }
     return result;
 }
@@ -90,12 +90,50 @@ QImage reduced(const QImage& image, QSize size) {
     QImage small(size, QImage::Format_RGB32);
     constexpr int bits = 32;
     const bool scaled =
-        Raster_Scale(small.bits(), static_cast<int>(small.bytesPerLine()), bits, bits, small.width(),
-                     small.height(), 1, RasterRect::fromSize(0, 0, small.width(), small.height()),
+        Raster_Scale(small.bits(), static_cast<int>(small.bytesPerLine()), bits, bits, size.width(),
+                     size.height(), 1, RasterRect::fromSize(0, 0, size.width(), size.height()),
                      image.constBits(), static_cast<int>(image.bytesPerLine()), bits, bits, 0, image.width(),
                      image.height(), 1, static_cast<double>(size.width()) / image.width(),
                      static_cast<double>(size.height()) / image.height(), 1);
     return scaled ? small : QImage();
+}
+
+/// What a pixel of an enlarged line lies between.
+struct Place {
+    int before;
+    int after;
+    float part; ///< of the way to the one after
+};
+
+Place placeIn(int length, int pixel, int enlargedLength) {
+    const float center = (static_cast<float>(pixel) + 0.5F) / static_cast<float>(enlargedLength);
+    const float place = std::max(0.0F, center * static_cast<float>(length) - 0.5F);
+    const int before = static_cast<int>(place);
+    return {before, std::min(before + 1, length - 1), place - static_cast<float>(before)};
+}
+
+Pixel::Channels between(const Pixel& before, const Pixel& after, float part) {
+    return before.channels + part * (after.channels - before.channels);
+}
+
+/// By two taps each way. In this thread: the toolkit would wake a pool of them, and wait for the slowest.
+QImage enlarged(const QImage& image, QSize size) {
+    QImage result(size, QImage::Format_RGB32);
+    std::vector<Pixel> line(static_cast<std::size_t>(image.width()));
+    for (int y = 0; y < size.height(); ++y) {
+        const Place row = placeIn(image.height(), y, size.height());
+        const auto* above = reinterpret_cast<const QRgb*>(image.constScanLine(row.before));
+        const auto* below = reinterpret_cast<const QRgb*>(image.constScanLine(row.after));
+        for (std::size_t x = 0; x < line.size(); ++x)
+            line[x].channels = between(toPixel(above[x]), toPixel(below[x]), row.part);
+        auto* pixels = reinterpret_cast<QRgb*>(result.scanLine(y));
+        for (int x = 0; x < size.width(); ++x) {
+            const Place place = placeIn(image.width(), x, size.width());
+            pixels[x] = toRgb(between(line[static_cast<std::size_t>(place.before)],
+                                      line[static_cast<std::size_t>(place.after)], place.part));
+        }
+    }
+    return result;
 }
 
 } // namespace
@@ -108,8 +146,9 @@ QImage blurredImage(const QImage& image, double sigma) {
 
 QImage menuBackground(const QImage& screen) {
     if (screen.width() < 2) return {};
-    const QSizeF half = screen.deviceIndependentSize() / 2;
-    return blurredImage(
-        reduced(screen.convertToFormat(QImage::Format_RGB32), half.toSize().expandedTo({1, 1})),
-        halfSizeSigma);
+    const QSize half = (screen.deviceIndependentSize() / 2).toSize().expandedTo({1, 1});
+    const QImage small = reduced(screen.convertToFormat(QImage::Format_RGB32), half);
+    QImage background = enlarged(blurredImage(small, halfSizeSigma), screen.size());
+    background.setDevicePixelRatio(screen.devicePixelRatio());
+    return background;
 }

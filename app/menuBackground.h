@@ -7,6 +7,5 @@
 /// A Gaussian blur of an opaque picture that goes on beyond its edges as it ends there. `sigma` is in pixels.
 QImage blurredImage(const QImage& image, double sigma);
 
-/// The screen blurred by 8 points, at half the size: to be drawn smoothly enlarged. Null for one that is less
-/// than 2 pixels wide.
+/// The screen blurred by 8 points, in its own size. Null for one that is less than 2 pixels wide.
 QImage menuBackground(const QImage& screen);

@@ -4,6 +4,8 @@
 #include "app/menuMirroring.h"
 #include "app/menuPicture.h"
 
+#include <QAction>
+#include <QCoreApplication>
 #include <QKeyEvent>
 #include <QPainter>
 #include <QStyle>
@@ -47,16 +49,23 @@ SMSearchField::SMSearchField(QWidget* parent)
     : QLineEdit(parent) {
     setFrame(false);
     setTextMargins(textMargin, 0, textMargin, 0);
-    QFont text = font();
-    text.setPixelSize(fontSize);
-    setFont(text);
+    QFont textFont = font();
+    textFont.setPixelSize(fontSize);
+    setFont(textFont);
     QPalette colors = palette();
     colors.setColor(QPalette::Base, Qt::transparent);
     colors.setColor(QPalette::Text, Qt::black);
     colors.setColor(QPalette::Highlight, selection);
     colors.setColor(QPalette::HighlightedText, Qt::white);
     setPalette(colors);
-    connect(this, &QLineEdit::textChanged, this, [this] {
+    // The toolkit's own button fades in, which paints the panel ten times for one key.
+    QAction* clearing =
+        addAction(style()->standardIcon(QStyle::SP_LineEditClearButton), QLineEdit::TrailingPosition);
+    clearing->setText(QCoreApplication::translate("SMSearchField", "Clear"));
+    clearing->setVisible(false);
+    connect(clearing, &QAction::triggered, this, &QLineEdit::clear);
+    connect(this, &QLineEdit::textChanged, this, [this, clearing](const QString& text) {
+        clearing->setVisible(!text.isEmpty());
         if (m_textHandler && !m_isSetFromCode) m_textHandler();
     });
 }

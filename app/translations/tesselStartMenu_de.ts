@@ -17,6 +17,13 @@
     </message>
 </context>
 <context>
+    <name>SMSearchField</name>
+    <message>
+        <source>Clear</source>
+        <translation>Löschen</translation>
+    </message>
+</context>
+<context>
     <name>SMStatusItemView</name>
     <message>
         <source>Start menu</source>

@@ -5,6 +5,8 @@
 
 #include <algorithm>
 #include <cmath>
+#include <cstddef>
+#include <cstdint>
 #include <vector>
 
 namespace {
@@ -102,36 +104,41 @@ QImage reduced(const QImage& image, QSize size) {
 struct Place {
     int before;
     int after;
-    float part; ///< of the way to the one after
+    std::uint32_t part; ///< of 256, from the one before
 };
 
 Place placeIn(int length, int pixel, int enlargedLength) {
-    const float center = (static_cast<float>(pixel) + 0.5F) / static_cast<float>(enlargedLength);
-    const float place = std::max(0.0F, center * static_cast<float>(length) - 0.5F);
+    const double center = (pixel + 0.5) * length / enlargedLength;
+    const double place = std::max(0.0, center - 0.5);
     const int before = static_cast<int>(place);
-    return {before, std::min(before + 1, length - 1), place - static_cast<float>(before)};
+    return {before, std::min(before + 1, length - 1), static_cast<std::uint32_t>((place - before) * 256)};
 }
 
-Pixel::Channels between(const Pixel& before, const Pixel& after, float part) {
-    return before.channels + part * (after.channels - before.channels);
+/// Two channels at once.
+QRgb between(QRgb before, QRgb after, std::uint32_t part) {
+    constexpr QRgb twoChannels = 0x00FF00FF;
+    const auto mixed = [part](QRgb a, QRgb b) { return ((a * (256 - part) + b * part) >> 8) & twoChannels; };
+    return mixed(before & twoChannels, after & twoChannels) |
+           mixed((before >> 8) & twoChannels, (after >> 8) & twoChannels) << 8;
 }
 
 /// By two taps each way. In this thread: the toolkit would wake a pool of them, and wait for the slowest.
 QImage enlarged(const QImage& image, QSize size) {
     QImage result(size, QImage::Format_RGB32);
-    std::vector<Pixel> line(static_cast<std::size_t>(image.width()));
+    std::vector<Place> columns;
+    for (int x = 0; x < size.width(); ++x)
+        columns.push_back(placeIn(image.width(), x, size.width()));
+    std::vector<QRgb> line(static_cast<std::size_t>(image.width()));
     for (int y = 0; y < size.height(); ++y) {
         const Place row = placeIn(image.height(), y, size.height());
         const auto* above = reinterpret_cast<const QRgb*>(image.constScanLine(row.before));
         const auto* below = reinterpret_cast<const QRgb*>(image.constScanLine(row.after));
         for (std::size_t x = 0; x < line.size(); ++x)
-            line[x].channels = between(toPixel(above[x]), toPixel(below[x]), row.part);
-        auto* pixels = reinterpret_cast<QRgb*>(result.scanLine(y));
-        for (int x = 0; x < size.width(); ++x) {
-            const Place place = placeIn(image.width(), x, size.width());
-            pixels[x] = toRgb(between(line[static_cast<std::size_t>(place.before)],
-                                      line[static_cast<std::size_t>(place.after)], place.part));
-        }
+            line[x] = between(above[x], below[x], row.part);
+        std::ranges::transform(columns, reinterpret_cast<QRgb*>(result.scanLine(y)), [&](const Place& place) {
+            return between(line[static_cast<std::size_t>(place.before)],
+                           line[static_cast<std::size_t>(place.after)], place.part);
+        });
     }
     return result;
 }

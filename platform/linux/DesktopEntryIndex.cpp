@@ -99,6 +99,8 @@ std::string DesktopEntryIndex::executableOf(const std::string& program,
     }
     for (const auto& candidate : candidates) {
         std::error_code error;
+        // Resolving asks for every part of a path: not where nothing is, as in most directories.
+        if (!fs::exists(candidate, error)) continue;
         auto executable = fs::canonical(candidate, error);
         if (!error) return executable;
     }

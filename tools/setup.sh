@@ -1,7 +1,7 @@
 # Shared by ./run and ./test: what the machine needs, and the build. Sourced, from the project's root.
 
 BUILD_PACKAGES=(g++ cmake ninja-build pkg-config qt6-base-dev qt6-svg-dev libxcb1-dev libxcb-res0-dev libxcb-shm0-dev
-    libxcb-xinput-dev libtiff-dev libexpat1-dev libglib2.0-dev libtomlplusplus-dev qt6-tools-dev qt6-l10n-tools)
+    libxcb-sync-dev libxcb-xinput-dev libtiff-dev libexpat1-dev libglib2.0-dev libtomlplusplus-dev qt6-tools-dev qt6-l10n-tools)
 # What a machine without a display needs to show one all the same.
 DISPLAY_PACKAGES=(xvfb openbox xdotool x11-utils imagemagick dbus adwaita-icon-theme fonts-dejavu-core
     fonts-wqy-zenhei fonts-lohit-deva fonts-tlwg-loma)

@@ -7,6 +7,7 @@
 #include "platform/linux/ReducedMotion.h"
 #include "platform/linux/XcbCapture.h"
 #include "platform/linux/XcbPanel.h"
+#include "platform/linux/XcbServerTime.h"
 
 #include <QAbstractNativeEventFilter>
 #include <QApplication>
@@ -61,8 +62,7 @@ public:
 
     void makeKeyAndOrderFront() override {
         if (!isVisible()) {
-            m_activeBefore = XcbActiveWindow();
-            m_focusBefore = XcbInputFocus();
+            rememberFocus();
             followCompositor();
             tellOption(); // it may have changed while another window had the keyboard
         }
@@ -76,11 +76,8 @@ public:
     void orderOut() override {
         if (!isVisible()) return;
         m_keyboard.reset();
-        const bool isKey = XcbInputFocus() == nativeWindow();
-        // Some window managers have not noticed that another had it, and would do nothing.
-        if (isKey) XcbSetInputFocus(m_focusBefore);
+        if (XcbInputFocus() == nativeWindow()) XcbSetInputFocus(m_focusBefore, m_keySince);
         m_view.hide();
-        if (isKey) XcbActivateWindow(m_activeBefore);
     }
 
     void addWindowFilter() override {
@@ -107,12 +104,20 @@ public:
 private:
     std::uint32_t nativeWindow() const { return static_cast<std::uint32_t>(m_view.winId()); }
 
+    void rememberFocus() {
+        // Inside of the active window or, in the middle of a click, with the window manager itself.
+        const auto active = XcbActiveWindow();
+        const auto focus = XcbInputFocus();
+        m_focusBefore = active == 0 || XcbIsWithin(focus, active) ? focus : active;
+    }
+
     void takeKeyboard() {
         // A focus that a window takes by itself, some of Wayland's compositors take away again at once.
         if (XcbIsUnderWayland()) m_keyboard = XcbGrabKeyboard(nativeWindow());
         if (m_keyboard) return;
         m_view.activateWindow();
-        XcbSetInputFocus(nativeWindow());
+        m_keySince = XcbServerTime();
+        XcbSetInputFocus(nativeWindow(), m_keySince);
     }
 
     /// Whether a window is see-through is decided when it is made, so it is made anew where that changed.
@@ -169,8 +174,10 @@ private:
     PanelDelegate& m_delegate;
     std::function<KXRect()> m_ownArea;
     KXRect m_frame;
-    std::uint32_t m_activeBefore = 0;
     std::uint32_t m_focusBefore = 0;
+    /// Given back as of this time: whom anybody gives the keyboard to for what the user did since keeps it,
+    /// whoever is heard first, and though not all know how late it is.
+    std::uint32_t m_keySince = 0;
     std::unique_ptr<Handle> m_keyboard;
     bool m_hasFilter = false;
 };

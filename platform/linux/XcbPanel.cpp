@@ -101,11 +101,21 @@ bool XcbHasInputFocus() {
     });
 }
 
-void XcbSetInputFocus(std::uint32_t window) {
+bool XcbIsWithin(std::uint32_t window, std::uint32_t outer) {
+    auto* c = XcbConnection();
+    while (c && window > XCB_INPUT_FOCUS_POINTER_ROOT && window != outer) {
+        const XcbReply<xcb_query_tree_reply_t> tree(
+            xcb_query_tree_reply(c, xcb_query_tree(c, window), nullptr));
+        window = tree ? tree->parent : xcb_window_t{XCB_WINDOW_NONE};
+    }
+    return window == outer && window != XCB_WINDOW_NONE;
+}
+
+void XcbSetInputFocus(std::uint32_t window, std::uint32_t time) {
     auto* c = XcbConnection();
     if (!c) return;
     // Checked, though nothing can be done: the toolkit would report that the window has gone meanwhile.
-    const auto cookie = xcb_set_input_focus_checked(c, XCB_INPUT_FOCUS_PARENT, window, XCB_CURRENT_TIME);
+    const auto cookie = xcb_set_input_focus_checked(c, XCB_INPUT_FOCUS_PARENT, window, time);
     const XcbReply<xcb_generic_error_t> error(xcb_request_check(c, cookie));
 }
 
@@ -119,14 +129,6 @@ std::unique_ptr<Handle> XcbHoldTyping() {
 std::unique_ptr<Handle> XcbGrabKeyboard(std::uint32_t window) {
     if (!XcbConnection()) return nullptr;
     return std::make_unique<KeyboardGrab>(window, XCB_GRAB_MODE_ASYNC);
-}
-
-void XcbActivateWindow(std::uint32_t window) {
-    auto* c = XcbConnection();
-    if (!c || window == 0) return;
-    constexpr std::uint32_t sourcePager = 2; // "application" may be refused
-    XcbSendToRoot(c, window, "_NET_ACTIVE_WINDOW", {sourcePager, XCB_CURRENT_TIME, 0, 0, 0});
-    xcb_flush(c);
 }
 
 void XcbWatchButtonPresses() {

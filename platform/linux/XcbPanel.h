@@ -26,15 +26,16 @@ std::uint32_t XcbActiveWindow();
 std::uint32_t XcbInputFocus();
 /// Whether any visible window of this process has the keyboard.
 bool XcbHasInputFocus();
-/// Gives the window the keyboard, if it can be seen.
-void XcbSetInputFocus(std::uint32_t window);
+/// Whether the first window is the second, or lies somewhere in it.
+bool XcbIsWithin(std::uint32_t window, std::uint32_t outer);
+/// Gives the window the keyboard, if it can be seen, and if nobody was given it after that time of the
+/// server's.
+void XcbSetInputFocus(std::uint32_t window, std::uint32_t time);
 /// Until the handle ends no key event reaches any program; then those that wait go to the window that has the
 /// keyboard. For moments only. Null where that cannot be had.
 std::unique_ptr<Handle> XcbHoldTyping();
 /// All keys go to the window until the handle ends, whoever has the focus. The window must be seen.
 std::unique_ptr<Handle> XcbGrabKeyboard(std::uint32_t window);
-/// Asks the window manager to make the window active again.
-void XcbActivateWindow(std::uint32_t window);
 
 /// Asks for presses of buttons anywhere on the screen, whoever gets them.
 void XcbWatchButtonPresses();

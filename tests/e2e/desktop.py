@@ -35,9 +35,10 @@ class Window:
         return bool(self.id())
 
     def frame(self):
-        """(x, y, width, height), from the top left of the screen."""
+        """(x, y, width, height), from the top left of the screen; None while it is not there to be seen."""
         text = run("xdotool", "getwindowgeometry", "--shell", self.id())
-        return tuple(int(re.search(f"^{key}=(-?[0-9]+)", text, re.M)[1]) for key in ("X", "Y", "WIDTH", "HEIGHT"))
+        frame = re.search(r"X=(-?\d+)\nY=(-?\d+)\nWIDTH=(\d+)\nHEIGHT=(\d+)", text)
+        return frame and tuple(map(int, frame.groups()))
 
 
 def point(x, y):

@@ -42,20 +42,12 @@ def trayer(edge, align):
             "--SetDockType", "true", "--SetPartialStrut", "true"]
 
 
-def item_frame():
-    """Of the item's own window; None while there is none to be seen."""
-    try:
-        return ITEM.frame()
-    except TypeError:
-        return None
-
-
 def item_is_in_strip():
-    return item_frame() == STRIP
+    return ITEM.frame() == STRIP
 
 
 def item_is_in_tray():
-    frame = item_frame()
+    frame = ITEM.frame()
     return frame if frame and frame != STRIP else None
 
 
@@ -205,7 +197,7 @@ class StatusHosts(unittest.TestCase):
         host = self.start("lxqt-panel")
 
         def is_there():
-            return not item_frame() and inked(1258, 774, 20, 20)
+            return not ITEM.frame() and inked(1258, 774, 20, 20)
         wait_until("the icon in the bar", is_there)
         x, y = 1268, 784
         self.opens_by_any_button_and_types(x, y, (1, 2, 3))

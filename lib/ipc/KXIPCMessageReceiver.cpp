@@ -13,15 +13,14 @@
 #include <iterator>
 #include <memory>
 #include <mutex>
-#include <optional>
 #include <string>
 #include <system_error>
 #include <thread>
 #include <utility>
 #include <vector>
 
-/// One port from start to end notice. What arrived waits in an inbox here; a task posted to the main loop
-/// takes one thing out, and posts the next: so all of it goes when the worker goes, whatever is still posted.
+/// One port from start to end notice. What arrived waits here; a task posted to the main loop takes a few
+/// things out, and posts the next: so all of it goes when the worker goes, whatever is still posted.
 class KXIPCMessageReceiver::Worker : public std::enable_shared_from_this<Worker> {
 public:
     explicit Worker(KXIPCMessageReceiver& receiver)
@@ -45,12 +44,16 @@ public:
         close();
         join();
         m_inbox.clear();
+        m_ready.clear();
     }
 
     bool hasPort() const { return m_port != nullptr; }
     bool hasTerminated() const { return m_hasTerminated; }
 
 private:
+    /// Handled in one turn of the main loop, whose turn costs about as much as handling one.
+    static constexpr int largestGroup = 16;
+
     struct Delivery {
         plist::Value envelope; ///< nil: the end
         std::unique_ptr<platform::Receipt> receipt;
@@ -114,22 +117,24 @@ private:
         });
     }
 
-    std::optional<Delivery> takeDelivery() {
-        const std::lock_guard lock(m_mutex);
-        m_isPosted = m_inbox.size() > 1;
-        if (m_inbox.empty()) return std::nullopt;
-        auto delivery = std::move(m_inbox.front());
-        m_inbox.pop_front();
-        // Before this one is handled: its handler may turn the loop.
-        if (m_isPosted) postDelivery();
-        return delivery;
+    void deliver() {
+        {
+            const std::lock_guard lock(m_mutex);
+            std::ranges::move(m_inbox, std::back_inserter(m_ready));
+            m_inbox.clear();
+            m_isPosted = m_ready.size() > 1;
+        }
+        if (m_ready.size() > 1) postDelivery(); // before any is handled: its handler may turn the loop
+        for (int i = 0; i < largestGroup && !m_ready.empty(); ++i) {
+            const auto delivery = std::move(m_ready.front());
+            m_ready.pop_front();
+            handle(delivery);
+        }
     }
 
-    void deliver() {
-        const auto delivery = takeDelivery();
-        if (!delivery) return;
+    void handle(const Delivery& delivery) {
         auto& delegate = m_receiver.m_delegate;
-        if (!delivery->envelope.isNil()) return delegate.onRemoteMessageReceived(delivery->envelope);
+        if (!delivery.envelope.isNil()) return delegate.onRemoteMessageReceived(delivery.envelope);
         join();
         m_hasTerminated = true;
         std::erase(m_receiver.m_stoppingThreads, shared_from_this());
@@ -144,11 +149,12 @@ private:
     platform::MainLoop& m_mainLoop;
     std::unique_ptr<platform::LocalPort> m_port;
     std::thread m_thread;
-    LogLimit m_logLimit;
-    std::mutex m_mutex;
-    std::deque<Delivery> m_inbox;
-    bool m_isPosted = false; ///< a task for the first of the inbox
     bool m_hasTerminated = false;
+    LogLimit m_logLimit;
+    std::deque<Delivery> m_ready; ///< main thread
+    std::mutex m_mutex;           ///< guards what follows
+    std::vector<Delivery> m_inbox;
+    bool m_isPosted = false; ///< a task that will look into the inbox
 };
 
 KXIPCMessageReceiver::KXIPCMessageReceiver(KXIPCContext& context, KXIPCMessageReceiverDelegate& delegate)

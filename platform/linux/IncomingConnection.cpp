@@ -44,10 +44,11 @@ void IncomingConnection::letGo(const PacketHeader& header) {
 }
 
 void IncomingConnection::answer(std::uint64_t sequence) {
+    // A sender that leaves its answers unread until there is no room for them is cut off. Not locked: it
+    // may send again, and be read, before this returns.
+    const bool sent = SendAnswer(socket(), sequence) == Sending::taken;
     const std::lock_guard lock(m_mutex);
     --m_answersDue;
-    // A sender that leaves its answers unread until there is no room for them is cut off.
-    const bool sent = SendAnswer(socket(), sequence) == Sending::taken;
     if (!sent || (m_closed && m_answersDue == 0)) shutdown(socket(), SHUT_RDWR);
 }
 

@@ -65,6 +65,12 @@ double OneWay(const Rival& rival, const std::string& place) {
     return static_cast<double>(pair.board().handledAt - start) / 1000 / count;
 }
 
+/// Until the receiver has given back what it held: a sender that fills memory meanwhile takes half again as
+/// long, and which end it is that gives it back differs.
+void RestAfter(const Payload& payload) {
+    Rest(300 + static_cast<int>(payload.bytes.size() / 500));
+}
+
 template <int applications>
 double Visible(const Rival& rival, const std::string& place) {
     Pair pair(rival, place);
@@ -72,7 +78,7 @@ double Visible(const Rival& rival, const std::string& place) {
     Times times;
     for (int i = 0; i < 10; ++i) {
         times.push_back(pair.timeToHandle(payload));
-        Rest(3000); // what it held is freed meanwhile
+        RestAfter(payload);
     }
     times.erase(times.begin(), times.begin() + 2);
     return Median(times);
@@ -85,7 +91,7 @@ double Update(const Rival& rival, const std::string& place) {
     Times times;
     for (int i = 0; i < (allSizes ? 8 : 52); ++i) {
         times.push_back(pair.timeToHandle(payload));
-        Rest(allSizes ? 3000 : 300);
+        RestAfter(payload);
     }
     times.erase(times.begin(), times.begin() + 2);
     return Median(times);

@@ -8,6 +8,8 @@
 #include "platform/linux/PortPacket.h"
 #include "platform/linux/SealedMemory.h"
 
+#include <algorithm>
+#include <array>
 #include <chrono>
 #include <cstddef>
 #include <cstdint>
@@ -16,6 +18,7 @@
 #include <memory>
 #include <mutex>
 #include <optional>
+#include <span>
 #include <string>
 #include <sys/ioctl.h>
 #include <utility>
@@ -67,8 +70,8 @@ SendStatus Destination::send(BytePieces pieces, bool synchronous, RemotePort::Ti
     if (!packet) return SendStatus::transportError;
     std::unique_lock lock(m_mutex);
     if (m_queue.empty()) {
-        Socket socket;
-        const auto sending = transmit(lock, *packet, socket);
+        const OutgoingPacket* const one[] = {&*packet};
+        const auto [sending, count, socket] = transmit(lock, one);
         if (!MustWait(sending)) {
             if (!synchronous || sending != Sending::taken) return StatusFrom(sending);
             lock.unlock();
@@ -108,16 +111,14 @@ std::optional<Destination::Pending> Destination::flush() {
     std::unique_lock lock(m_mutex);
     giveUpOverdue();
     while (!m_queue.empty()) {
-        const auto first = m_queue.front();
-        m_transmitting = true;
-        const auto sending = transmit(lock, first->packet, first->takenBy);
-        m_transmitting = false;
-        m_changed.notify_all();
-        if (MustWait(sending)) return Pending{sending == Sending::busy ? m_socket : nullptr, first->deadline};
-        if (sending == Sending::taken) {
+        const auto [sending, count, socket] = transmitFirst(lock);
+        for (std::size_t i = 0; i < count; ++i) {
+            m_queue.front()->takenBy = socket;
             removeFirst();
-            continue;
         }
+        if (MustWait(sending))
+            return Pending{sending == Sending::busy ? m_socket : nullptr, m_queue.front()->deadline};
+        if (sending == Sending::taken) continue;
         // Without a receiver the rest has nowhere to go either.
         const auto given = sending == Sending::hungUp ? m_queue.size() : 1;
         for (std::size_t i = 0; i < given; ++i)
@@ -149,26 +150,45 @@ Sending Destination::openConnection() {
     return Sending::taken;
 }
 
-/// Unlocks while the system copies the packet: an asynchronous sender must not wait for that.
-Sending Destination::transmit(std::unique_lock<std::mutex>& lock, const OutgoingPacket& packet,
-                              Socket& takenBy) {
+/// The one that is first in the queue, and those after it that can go along.
+Destination::Transmission Destination::transmitFirst(std::unique_lock<std::mutex>& lock) {
+    std::array<std::shared_ptr<Waiting>, OutgoingPacket::largestGroup> kept;
+    std::array<const OutgoingPacket*, OutgoingPacket::largestGroup> packets;
+    std::size_t count = 0;
+    for (; count < std::min(packets.size(), m_queue.size()); ++count) {
+        kept[count] = m_queue[count];
+        packets[count] = &kept[count]->packet;
+        if (packets[count]->hasDescriptor()) break;
+    }
+    m_transmitting = std::max<std::size_t>(count, 1);
+    const auto transmission = transmit(lock, std::span(packets).first(m_transmitting));
+    m_transmitting = 0;
+    m_changed.notify_all();
+    return transmission;
+}
+
+/// Several in memory never go together. Unlocks while the system copies the packets: an asynchronous sender
+/// must not wait for that.
+Destination::Transmission Destination::transmit(std::unique_lock<std::mutex>& lock, Packets packets) {
+    const auto& first = *packets.front();
     for (int attempt = 0; attempt < 2; ++attempt) {
         if (!m_socket) {
             const auto opening = openConnection();
-            if (opening != Sending::taken) return opening;
+            if (opening != Sending::taken) return {opening};
         }
-        if (packet.hasDescriptor() && !hasRoomOnTheWay(packet)) return Sending::exhausted;
+        if (first.hasDescriptor() && !hasRoomOnTheWay(first)) return {Sending::exhausted};
         const auto socket = m_socket;
         lock.unlock();
-        const auto sending = packet.send(socket->get());
-        if (sending == Sending::taken) m_tap.didSend(packet, socket->get());
+        auto sending = Sending::taken;
+        const auto count = OutgoingPacket::sendAll(socket->get(), packets, sending);
+        for (const auto* packet : packets.first(count))
+            m_tap.didSend(*packet, socket->get());
         lock.lock();
-        if (sending == Sending::taken) takenBy = socket;
-        if (sending == Sending::taken && packet.hasDescriptor()) m_onTheWay += packet.size();
-        if (sending != Sending::hungUp) return sending;
+        if (count > 0 && first.hasDescriptor()) m_onTheWay += first.size();
+        if (sending != Sending::hungUp) return {sending, count, socket};
         if (m_socket == socket) endConnection();
     }
-    return Sending::hungUp;
+    return {Sending::hungUp};
 }
 
 bool Destination::hasRoomOnTheWay(const OutgoingPacket& packet) {
@@ -211,13 +231,13 @@ SendStatus Destination::awaitTurn(std::unique_lock<std::mutex>& lock, const std:
                                   RemotePort::Timeouts timeouts) {
     const auto isDone = [&] { return waiting->takenBy || waiting->fate; };
     m_changed.wait_for(lock, timeouts.send, isDone);
-    m_changed.wait(lock, [&] { return isDone() || !m_transmitting || m_queue.front() != waiting; });
+    // Only the main thread adds to the queue, and it was here: the message is the last.
+    m_changed.wait(lock, [&] { return isDone() || m_transmitting < m_queue.size(); });
     if (waiting->fate) return *waiting->fate;
     if (const auto socket = waiting->takenBy) {
         lock.unlock();
         return awaitAnswer(socket, waiting->packet.sequence(), timeouts.receive);
     }
-    // Only the main thread adds to the queue, and it was here: the message is the last.
     countQueued(waiting->packet, false);
     m_queue.pop_back();
     noteDrop();
@@ -251,7 +271,7 @@ void Destination::setPatience(const Socket& socket, std::chrono::milliseconds ti
 }
 
 void Destination::giveUpOverdue() {
-    while (!m_queue.empty() && !m_transmitting && m_queue.front()->deadline <= m_clock.now())
+    while (!m_queue.empty() && m_transmitting == 0 && m_queue.front()->deadline <= m_clock.now())
         giveUpFirst(SendStatus::sendTimeout);
 }
 

@@ -65,7 +65,14 @@ private:
     using Queue = std::deque<std::shared_ptr<Waiting>>;
 
     Sending openConnection();
-    Sending transmit(std::unique_lock<std::mutex>& lock, const OutgoingPacket& packet, Socket& takenBy);
+    using Packets = std::span<const OutgoingPacket* const>;
+    struct Transmission {
+        Sending sending;
+        std::size_t count = 0; ///< of packets that were taken
+        Socket socket{};       ///< by which
+    };
+    Transmission transmit(std::unique_lock<std::mutex>& lock, Packets packets);
+    Transmission transmitFirst(std::unique_lock<std::mutex>& lock);
     void endConnection();
     bool hasRoomOnTheWay(const OutgoingPacket& packet);
     void drainLocked();
@@ -95,9 +102,9 @@ private:
     mutable std::mutex m_mutex; ///< guards what follows; nothing that takes long is done with it
     std::condition_variable m_changed;
     Socket m_socket;
-    std::size_t m_onTheWay = 0;  ///< bytes in memory that the receiver may not have taken yet
-    Queue m_queue;               ///< while it is empty, the main thread sends; else the flusher
-    bool m_transmitting = false; ///< the first of the queue
+    std::size_t m_onTheWay = 0;     ///< bytes in memory that the receiver may not have taken yet
+    Queue m_queue;                  ///< while it is empty, the main thread sends; else the flusher
+    std::size_t m_transmitting = 0; ///< so many of the first in the queue
     std::size_t m_queuedBytes = 0;
     std::size_t m_queuedDescriptors = 0;
     bool m_ended = false;

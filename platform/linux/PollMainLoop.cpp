@@ -11,6 +11,7 @@
 #include <mutex>
 #include <optional>
 #include <set>
+#include <span>
 #include <sys/epoll.h>
 #include <sys/eventfd.h>
 
@@ -38,7 +39,11 @@ struct PollMainLoop::Watch {
 /// Which descriptors are waited for. Two watches may share one.
 class PollMainLoop::Poll {
 public:
-    explicit Poll(int wake) { control(EPOLL_CTL_ADD, wake, EPOLLIN | EPOLLET); }
+    /// The wake is told of once for each time that it is written, and never read.
+    explicit Poll(int wake)
+        : m_wake(wake) {
+        control(EPOLL_CTL_ADD, wake, EPOLLIN | EPOLLET);
+    }
 
     void add(int descriptor) {
         if (++m_watches[descriptor] > 1) return;
@@ -50,14 +55,14 @@ public:
         m_watches.erase(descriptor);
         if (m_alwaysReadable.erase(descriptor) == 0) control(EPOLL_CTL_DEL, descriptor, 0);
     }
-    /// Waits, and answers what can be read.
+    /// Waits, and answers what can be read besides the wake.
     std::set<int> wait(int timeout) {
         std::array<epoll_event, 32> events;
         const int count = epoll_wait(m_epoll.get(), events.data(), static_cast<int>(events.size()),
                                      m_alwaysReadable.empty() ? timeout : 0);
         auto readable = m_alwaysReadable;
-        for (int i = 0; i < count; ++i)
-            readable.insert(events[static_cast<std::size_t>(i)].data.fd);
+        for (const auto& event : std::span(events).first(static_cast<std::size_t>(std::max(count, 0))))
+            if (event.data.fd != m_wake) readable.insert(event.data.fd);
         return readable;
     }
 
@@ -69,6 +74,7 @@ private:
         return epoll_ctl(m_epoll.get(), operation, descriptor, &event) == 0;
     }
 
+    const int m_wake;
     const Descriptor m_epoll{epoll_create1(EPOLL_CLOEXEC)};
     std::map<int, int> m_watches; ///< how many, by descriptor
     std::set<int> m_alwaysReadable;
@@ -198,10 +204,9 @@ int PollMainLoop::pollTimeout(Milliseconds patience) const {
 }
 
 bool PollMainLoop::runReadable(Milliseconds patience) {
-    // The wake is told of once for each time that it is written, and never read.
     const auto readable = m_poll->wait(pollTimeout(patience));
     bool ran = false;
-    if (readable.empty() || (readable.size() == 1 && readable.contains(m_wake.get()))) return ran;
+    if (readable.empty()) return ran;
     const auto watches = m_watches; // callbacks add to the list
     for (const auto& watch : watches) {
         if (!watch->live || !readable.contains(watch->descriptor)) continue;

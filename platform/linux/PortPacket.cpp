@@ -13,6 +13,7 @@
 #include <sys/types.h>
 #include <sys/uio.h>
 
+#include <algorithm>
 #include <bit>
 #include <cerrno>
 #include <chrono>
@@ -51,20 +52,22 @@ Sending SendingFromErrno() {
     }
 }
 
-Sending SendMessage(int socket, const msghdr& message) {
+constexpr int sendFlags = MSG_DONTWAIT | MSG_NOSIGNAL;
+
+/// What the call returns, again while a signal interrupts it.
+template <class Call>
+auto Uninterrupted(const Call& call) {
     for (;;) {
-        if (sendmsg(socket, &message, MSG_DONTWAIT | MSG_NOSIGNAL) >= 0) return Sending::taken;
-        if (errno != EINTR) return SendingFromErrno();
+        const auto result = call();
+        if (result >= 0 || errno != EINTR) return result;
     }
 }
 
-/// -1 with errno. Whatever the sender left unread when it closed is told once, before what it sent, which
-/// counts.
-ssize_t ReceiveMessage(int socket, msghdr& message, int wait = MSG_DONTWAIT) {
-    for (;;) {
-        const auto length = recvmsg(socket, &message, wait | MSG_CMSG_CLOEXEC);
-        if (length >= 0 || (errno != ECONNRESET && (errno != EINTR || wait == 0))) return length;
-    }
+/// Whatever the sender left unread when it closed is told once, before what it sent, which counts.
+template <class Call>
+ssize_t DespiteReset(const Call& receive) {
+    const auto length = receive();
+    return length < 0 && errno == ECONNRESET ? receive() : length;
 }
 
 bool IsTruncated(const msghdr& message) {
@@ -144,9 +147,37 @@ void OutgoingPacket::own() {
     m_pieces.assign(1, *m_copy);
 }
 
-Sending OutgoingPacket::send(int socket) const {
-    return send(socket, m_header);
-}
+/// A packet as the system takes it, with all that this points at.
+class OutgoingPacket::Envelope {
+public:
+    void fill(const OutgoingPacket& packet, const PacketHeader& header, msghdr& message) {
+        m_header = header;
+        if (packet.m_pieces.size() >= m_few.size()) m_many.resize(packet.m_pieces.size() + 1);
+        message = {};
+        message.msg_iov = m_many.empty() ? m_few.data() : m_many.data();
+        auto* end = message.msg_iov;
+        *end++ = {&m_header, sizeof m_header};
+        for (const auto piece : packet.m_pieces)
+            *end++ = {const_cast<std::byte*>(piece.data()), piece.size()};
+        message.msg_iovlen = static_cast<std::size_t>(end - message.msg_iov);
+        if (packet.m_memory) attach(packet.m_memory.get(), message);
+    }
+
+private:
+    void attach(int descriptor, msghdr& message) {
+        m_control = {};
+        message.msg_control = &m_control;
+        message.msg_controllen = CMSG_SPACE(sizeof descriptor);
+        auto* rights = CMSG_FIRSTHDR(&message);
+        *rights = {CMSG_LEN(sizeof descriptor), SOL_SOCKET, SCM_RIGHTS};
+        std::memcpy(CMSG_DATA(rights), &descriptor, sizeof descriptor);
+    }
+
+    PacketHeader m_header;
+    std::array<iovec, 8> m_few{};
+    std::vector<iovec> m_many;
+    Control m_control{};
+};
 
 Sending OutgoingPacket::sendCopy(int socket, std::uint16_t flags, std::uint64_t sequence) const {
     auto header = m_header;
@@ -155,29 +186,29 @@ Sending OutgoingPacket::sendCopy(int socket, std::uint16_t flags, std::uint64_t 
     return send(socket, header);
 }
 
-Sending OutgoingPacket::send(int socket, PacketHeader header) const {
-    std::array<iovec, 8> few;
-    std::vector<iovec> many(m_pieces.size() < few.size() ? 0 : m_pieces.size() + 1);
-    auto* const vectors = many.empty() ? few.data() : many.data();
-    auto* end = vectors;
-    *end++ = {&header, sizeof header};
-    for (const auto piece : m_pieces)
-        *end++ = {const_cast<std::byte*>(piece.data()), piece.size()};
-    msghdr message = {};
-    message.msg_iov = vectors;
-    message.msg_iovlen = static_cast<std::size_t>(end - vectors);
-    Control control = {};
-    if (m_memory) {
-        message.msg_control = &control;
-        message.msg_controllen = CMSG_SPACE(sizeof(int));
-        auto* rights = CMSG_FIRSTHDR(&message);
-        rights->cmsg_level = SOL_SOCKET;
-        rights->cmsg_type = SCM_RIGHTS;
-        rights->cmsg_len = CMSG_LEN(sizeof(int));
-        const int number = m_memory.get();
-        std::memcpy(CMSG_DATA(rights), &number, sizeof number);
+Sending OutgoingPacket::send(int socket, const PacketHeader& header) const {
+    Envelope envelope;
+    msghdr message;
+    envelope.fill(*this, header, message);
+    const auto sent = Uninterrupted([&] { return sendmsg(socket, &message, sendFlags); });
+    return sent < 0 ? SendingFromErrno() : Sending::taken;
+}
+
+std::size_t OutgoingPacket::sendAll(int socket, std::span<const OutgoingPacket* const> packets,
+                                    Sending& sending) {
+    if (packets.size() == 1) {
+        sending = packets.front()->send(socket);
+        return sending == Sending::taken ? 1 : 0;
     }
-    return SendMessage(socket, message);
+    std::array<Envelope, largestGroup> envelopes;
+    std::array<mmsghdr, largestGroup> messages;
+    const auto count = std::min(packets.size(), largestGroup);
+    for (std::size_t i = 0; i < count; ++i)
+        envelopes[i].fill(*packets[i], packets[i]->m_header, messages[i].msg_hdr);
+    const auto sent = Uninterrupted(
+        [&] { return sendmmsg(socket, messages.data(), static_cast<unsigned>(count), sendFlags); });
+    sending = sent < 0 ? SendingFromErrno() : Sending::taken;
+    return sent < 0 ? 0 : static_cast<std::size_t>(sent);
 }
 
 Reading PacketReader::read(int socket, IncomingPacket& packet) {
@@ -190,7 +221,9 @@ Reading PacketReader::read(int socket, IncomingPacket& packet) {
     message.msg_iovlen = vectors.size();
     message.msg_control = &control;
     message.msg_controllen = sizeof control;
-    const auto received = ReceiveMessage(socket, message);
+    const auto received = DespiteReset([&] {
+        return Uninterrupted([&] { return recvmsg(socket, &message, MSG_DONTWAIT | MSG_CMSG_CLOEXEC); });
+    });
     if (received < 0) return errno == EAGAIN ? Reading::nothing : Reading::end;
     const auto descriptors = TakeControl(message, packet.sender);
     // An empty packet reads like the end, but has a sender.
@@ -220,28 +253,21 @@ Sending SendAnswer(int socket, std::uint64_t sequence) {
     PacketHeader header;
     header.flags = PacketHeader::isAnswer;
     header.sequence = sequence;
-    iovec vector{&header, sizeof header};
-    msghdr message = {};
-    message.msg_iov = &vector;
-    message.msg_iovlen = 1;
-    return SendMessage(socket, message);
+    const auto sent = Uninterrupted([&] { return ::send(socket, &header, sizeof header, sendFlags); });
+    return sent < 0 ? SendingFromErrno() : Sending::taken;
 }
 
 namespace {
 
 Reading ReadAnswer(int socket, std::uint64_t& sequence, int wait) {
     PacketHeader header;
-    iovec vector{&header, sizeof header};
-    msghdr message = {}; // without room for descriptors: the system drops those that come
-    message.msg_iov = &vector;
-    message.msg_iovlen = 1;
-    const auto received = ReceiveMessage(socket, message, wait);
+    // Told whole how long the packet is; without room for descriptors, the system drops those that come.
+    const auto received =
+        DespiteReset([&] { return recv(socket, &header, sizeof header, wait | MSG_TRUNC); });
     if (received < 0 && (errno == EAGAIN || errno == EINTR)) return Reading::nothing;
     if (received <= 0) return Reading::end;
     const PacketHeader expected{.flags = PacketHeader::isAnswer, .sequence = header.sequence};
-    if (received != sizeof header || IsTruncated(message) ||
-        std::memcmp(&header, &expected, sizeof header) != 0)
-        return Reading::bad;
+    if (received != sizeof header || std::memcmp(&header, &expected, sizeof header) != 0) return Reading::bad;
     sequence = header.sequence;
     return Reading::packet;
 }

@@ -59,7 +59,11 @@ public:
                                               std::size_t inlineLimit = maximalInlinePayload);
 
     void own();
-    Sending send(int socket) const; ///< never blocks
+    /// Never blocks.
+    Sending send(int socket) const { return send(socket, m_header); }
+    /// Several that own what goes inline, by one call. How many were taken; none: why not in `sending`.
+    static std::size_t sendAll(int socket, std::span<const OutgoingPacket* const> packets, Sending& sending);
+    static constexpr std::size_t largestGroup = 16;
     /// The same payload under other flags.
     Sending sendCopy(int socket, std::uint16_t flags, std::uint64_t sequence) const;
     bool wantsAnswer() const { return (m_header.flags & PacketHeader::wantsAnswer) != 0; }
@@ -68,7 +72,8 @@ public:
     std::uint64_t sequence() const { return m_header.sequence; }
 
 private:
-    Sending send(int socket, PacketHeader header) const;
+    class Envelope;
+    Sending send(int socket, const PacketHeader& header) const;
 
     PacketHeader m_header;
     std::vector<std::span<const std::byte>> m_pieces;

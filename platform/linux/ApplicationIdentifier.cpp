@@ -41,9 +41,16 @@ ApplicationIdentifier::ApplicationIdentifier(const ProcDirectory& processes, con
 }
 
 ProcessEvidence ApplicationIdentifier::evidenceOf(int pid, int parent) const {
-    const auto executable = m_processes.executable(pid);
-    return {executable, PrefixOf(executable) + "/share/applications", sandboxedID(pid),
-            idOfUnit(pid, parent)};
+    ProcessEvidence evidence;
+    evidence.executable = m_processes.executable(pid);
+    evidence.prefixDirectory = PrefixOf(evidence.executable) + "/share/applications";
+    evidence.sandboxID = sandboxedID(pid);
+    const auto group = m_processes.controlGroup(pid);
+    evidence.unitID = ApplicationIDOfControlGroup(group);
+    // Whatever was started in a terminal lives in the terminal's unit, and is not the terminal.
+    evidence.hasParentInUnit = evidence.unitID && m_processes.controlGroup(parent) == group;
+    if (evidence.hasParentInUnit) evidence.unitID.reset();
+    return evidence;
 }
 
 std::optional<Application> ApplicationIdentifier::applicationOf(const ProcessEvidence& evidence) {
@@ -65,13 +72,6 @@ std::optional<std::string> ApplicationIdentifier::sandboxedID(int pid) const {
     if (!info) return {};
     const std::string id(KeyFileGroup(*info, "Application")["name"]);
     return id.empty() || id.find('/') != id.npos ? std::nullopt : std::optional(id);
-}
-
-std::optional<std::string> ApplicationIdentifier::idOfUnit(int pid, int parent) const {
-    const auto group = m_processes.controlGroup(pid);
-    auto id = ApplicationIDOfControlGroup(group);
-    // Whatever was started in a terminal lives in the terminal's unit, and is not the terminal.
-    return id && m_processes.controlGroup(parent) != group ? id : std::nullopt;
 }
 
 Application ApplicationIdentifier::applicationWithID(const std::string& id) {

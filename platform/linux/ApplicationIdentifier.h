@@ -15,13 +15,15 @@ struct Application {
     bool noDisplay = false;
 };
 
-/// What tells which application a process is. Stays as it is while the process runs one program and its
-/// parent lives, but for the first moments: who starts an application moves it into its unit then.
+/// What tells which application a process is. Stays as it is while the process runs one program, but for the
+/// first moments, when who starts an application moves it into its unit; and but for the end of its parent,
+/// where that is in the same unit.
 struct ProcessEvidence {
     std::string executable;
     std::string prefixDirectory; ///< "share/applications" of the executable's own prefix
     std::optional<std::string> sandboxID;
     std::optional<std::string> unitID;
+    bool hasParentInUnit = false;
 };
 
 /// Tells which application a process is, by the first of: what its sandbox says it is; the desktop entry for
@@ -42,7 +44,6 @@ private:
     std::optional<Application> inDirectory(const std::string& applicationsDirectory,
                                            const std::string& executable);
     std::optional<std::string> sandboxedID(int pid) const;
-    std::optional<std::string> idOfUnit(int pid, int parent) const;
     Application applicationWithID(const std::string& id);
 
     const ProcDirectory& m_processes;

@@ -35,21 +35,22 @@ int ProcessID(std::string_view name) {
 ProcDirectory::ProcDirectory(const std::string& path)
     : m_directory(::open(path.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC)) {}
 
-std::vector<int> ProcDirectory::processesOfUser() const {
-    std::vector<int> pids;
+std::vector<ProcDirectory::Entry> ProcDirectory::entries() const {
+    std::vector<Entry> entries;
     const auto close = [](DIR* directory) { closedir(directory); };
     const int listing = openat(m_directory.get(), ".", O_RDONLY | O_DIRECTORY | O_CLOEXEC);
     const std::unique_ptr<DIR, decltype(close)> directory(fdopendir(listing), close);
-    if (!directory) return pids;
-    const uid_t user = geteuid();
-    while (const dirent* entry = readdir(directory.get())) {
-        struct stat status {};
-        const int pid = ProcessID(entry->d_name);
-        if (pid > 0 && fstatat(m_directory.get(), entry->d_name, &status, 0) == 0 && status.st_uid == user)
-            pids.push_back(pid);
-    }
-    std::ranges::sort(pids);
-    return pids;
+    if (!directory) return entries;
+    while (const dirent* entry = readdir(directory.get()))
+        if (const int pid = ProcessID(entry->d_name); pid > 0) entries.push_back({pid, entry->d_ino});
+    std::ranges::sort(entries, {}, &Entry::pid);
+    return entries;
+}
+
+bool ProcDirectory::isOfUser(int pid) const {
+    struct stat status {};
+    return fstatat(m_directory.get(), std::to_string(pid).c_str(), &status, 0) == 0 &&
+           status.st_uid == geteuid();
 }
 
 std::optional<std::uint64_t> ProcDirectory::ticksSinceBoot() const {

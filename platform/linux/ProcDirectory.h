@@ -3,6 +3,7 @@
 #include "platform/linux/Descriptor.h"
 #include "platform/linux/ProcRecords.h"
 
+#include <cstdint>
 #include <optional>
 #include <string>
 #include <vector>
@@ -15,8 +16,14 @@ class ProcDirectory {
 public:
     explicit ProcDirectory(const std::string& path);
 
-    /// Ascending. Left out are the processes that let nobody look into them, which the kernel gives to root.
-    std::vector<int> processesOfUser() const;
+    struct Entry {
+        int pid = 0;
+        std::uint64_t number = 0; ///< of the file; another one for another process
+    };
+    /// By ascending id.
+    std::vector<Entry> entries() const;
+    /// Not of a process that lets nobody look into it: the kernel gives it to root.
+    bool isOfUser(int pid) const;
 
     std::optional<std::uint64_t> ticksSinceBoot() const;
     std::optional<ProcStat> stat(int pid) const; ///< of a process that has not ended

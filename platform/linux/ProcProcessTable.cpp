@@ -105,31 +105,47 @@ std::optional<ProcessSerialNumber> ProcProcessTable::serialNumberOf(int pid) con
 
 std::optional<ProcessInfo> ProcProcessTable::nextProcess(ProcessSerialNumber after) const {
     if (after == ProcessSerialNumber{} || m_walk.empty()) startWalk();
-    for (auto pid = std::ranges::upper_bound(m_walk, ProcessIDOf(after)); pid != m_walk.end(); ++pid)
-        if (const auto stat = m_processes.stat(*pid)) return infoOf(*pid, *stat);
+    const auto first = std::ranges::upper_bound(m_walk, ProcessIDOf(after), {}, &ProcDirectory::Entry::pid);
+    for (auto entry = first; entry != m_walk.end(); ++entry)
+        if (auto info = infoOf(*entry)) return info;
     return {};
 }
 
 void ProcProcessTable::startWalk() const {
-    m_walk = m_processes.processesOfUser();
+    m_walk = m_processes.entries();
     m_walkTicks = m_processes.ticksSinceBoot().value_or(0);
-    std::erase_if(m_known,
-                  [&](const auto& known) { return !std::ranges::binary_search(m_walk, known.first); });
+    std::erase_if(m_known, [&](const auto& known) {
+        return !std::ranges::binary_search(m_walk, known.first, {}, &ProcDirectory::Entry::pid);
+    });
+}
+
+std::optional<ProcessInfo> ProcProcessTable::infoOf(ProcDirectory::Entry entry) const {
+    const auto before = m_known.find(entry.pid);
+    // One look instead of several: what has ended runs no program, and who may not look has no name for it.
+    if (before != m_known.end() && before->second.entry == entry.number &&
+        m_processes.executable(entry.pid) == before->second.evidence.executable)
+        return infoOf(entry.pid, before->second);
+    const auto stat = m_processes.isOfUser(entry.pid) ? m_processes.stat(entry.pid) : std::nullopt;
+    if (!stat) return {};
+    auto& known = knowledgeOf(entry.pid, *stat);
+    const auto& evidence = known.evidence;
+    known.entry =
+        known.isSettled && !evidence.executable.empty() && !evidence.hasParentInUnit ? entry.number : 0;
+    return infoOf(entry.pid, known);
 }
 
 std::optional<ProcessInfo> ProcProcessTable::info(ProcessSerialNumber process) const {
     const int pid = ProcessIDOf(process);
     const auto stat = m_processes.stat(pid);
     if (!stat || SerialNumber(pid, *stat) != process) return {};
-    return infoOf(pid, *stat);
+    return infoOf(pid, knowledgeOf(pid, *stat));
 }
 
-ProcessInfo ProcProcessTable::infoOf(int pid, const ProcStat& stat) const {
-    const auto& evidence = evidenceOf(pid, stat);
+ProcessInfo ProcProcessTable::infoOf(int pid, const Known& known) const {
     ProcessInfo info;
-    info.serialNumber = SerialNumber(pid, stat);
-    info.executablePath = evidence.executable;
-    auto application = m_applications.applicationOf(evidence);
+    info.serialNumber = SerialNumber(pid, known.stat);
+    info.executablePath = known.evidence.executable;
+    auto application = m_applications.applicationOf(known.evidence);
     info.isBackgroundOnly = !application;
     if (!application) return info;
     info.bundleIdentifier = std::move(application->id);
@@ -138,15 +154,16 @@ ProcessInfo ProcProcessTable::infoOf(int pid, const ProcStat& stat) const {
     return info;
 }
 
-const ProcessEvidence& ProcProcessTable::evidenceOf(int pid, const ProcStat& stat) const {
+ProcProcessTable::Known& ProcProcessTable::knowledgeOf(int pid, const ProcStat& stat) const {
     auto& known = m_known[pid];
-    const bool isSame = known.stat.startTicks == stat.startTicks && known.stat.parent == stat.parent &&
-                        known.stat.program == stat.program;
-    if (isSame && known.isSettled) return known.evidence;
+    const bool isSame = known.isSettled && known.stat.startTicks == stat.startTicks &&
+                        known.stat.parent == stat.parent &&
+                        known.evidence.executable == m_processes.executable(pid);
+    if (isSame) return known;
     // Also with a clock of its own, as in a container: then a process may seem to start in the future.
     const bool isSettled = m_walkTicks > stat.startTicks + ticksToSettle;
     known = {stat, isSettled, m_applications.evidenceOf(pid, stat.parent)};
-    return known.evidence;
+    return known;
 }
 
 bool ProcProcessTable::terminate(ProcessSerialNumber process) {

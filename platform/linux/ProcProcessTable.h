@@ -42,20 +42,22 @@ private:
         ProcStat stat;
         bool isSettled = false;
         ProcessEvidence evidence{};
+        std::uint64_t entry = 0; ///< its number, if the program alone tells whether all is as it was; else 0
     };
 
     Descriptor open(ProcessSerialNumber process) const;
     bool send(ProcessSerialNumber process, int signal) const;
     void startWalk() const;
-    ProcessInfo infoOf(int pid, const ProcStat& stat) const;
-    const ProcessEvidence& evidenceOf(int pid, const ProcStat& stat) const;
+    std::optional<ProcessInfo> infoOf(ProcDirectory::Entry entry) const;
+    ProcessInfo infoOf(int pid, const Known& known) const;
+    Known& knowledgeOf(int pid, const ProcStat& stat) const;
 
     MainLoop& m_mainLoop;
     ProcDirectory m_processes;
     mutable ApplicationIdentifier m_applications;
     /// This process once it was asked for, the id below the start; another's id after a fork.
     mutable std::atomic<std::uint64_t> m_current = 0;
-    mutable std::vector<int> m_walk; ///< the ids of the walk under way, ascending
+    mutable std::vector<ProcDirectory::Entry> m_walk; ///< the one under way, by ascending id
     mutable std::uint64_t m_walkTicks = 0;
     mutable std::unordered_map<int, Known> m_known; ///< by id, so that a walk reads little of each process
 };

@@ -3,7 +3,6 @@
 #include "lib/base/ParseNumber.h"
 
 #include <cstddef>
-#include <functional>
 #include <optional>
 #include <string>
 #include <string_view>
@@ -51,17 +50,12 @@ std::optional<ProcStat> ParseProcStat(std::string_view text) {
     const auto nameEnd = text.rfind(") ");
     if (nameEnd == text.npos) return {};
     const auto fields = Split(text.substr(nameEnd + 2), ' ');
-    constexpr std::size_t state = 0, parent = 1, startTime = 19, codeStart = 23, stackStart = 25;
+    constexpr std::size_t state = 0, parent = 1, startTime = 19;
     ProcStat stat;
     if (fields.size() <= startTime || fields[state].size() != 1 ||
         !ParseNumber(fields[parent], stat.parent) || !ParseNumber(fields[startTime], stat.startTicks))
         return {};
     stat.state = fields[state].front();
-    // The kernel places the program and its stack anew each time; where it tells nobody, the name is left.
-    stat.program = std::hash<std::string_view>()(text.substr(0, nameEnd));
-    if (fields.size() > stackStart)
-        for (const auto place : {fields[codeStart], fields[stackStart]})
-            stat.program = stat.program * 31 + std::hash<std::string_view>()(place);
     return stat;
 }
 

@@ -1,6 +1,5 @@
 #pragma once
 
-#include <cstddef>
 #include <cstdint>
 #include <optional>
 #include <string>
@@ -14,7 +13,6 @@ struct ProcStat {
     char state = 0;
     int parent = 0;
     std::uint64_t startTicks = 0; ///< since boot
-    std::size_t program = 0;      ///< another one once the process has executed another program
 
     bool hasEnded() const { return state == 'Z' || state == 'X' || state == 'x'; }
 };

@@ -80,18 +80,15 @@ struct ApplicationOfProcess : testing::Test {
     void writeEntry(const std::string& name, const std::string& keys) const {
         write(name, "[Desktop Entry]\nType=Application\n" + keys + "\n");
     }
-    void writeStat(int pid, int parent, const std::string& codeStart) const {
-        write("proc/" + std::to_string(pid) + "/stat",
-              std::to_string(pid) + " (x) S " + std::to_string(parent) +
-                  " 0 0 0 0 0 0 0 0 0 0 0 0 0 20 0 1 0 77 0 0 0 " + codeStart + " 0 0\n");
-    }
     void setExecutable(int pid, const std::string& executable) const {
         const auto link = path("proc/" + std::to_string(pid) + "/exe");
         fs::remove(link);
         fs::create_symlink(path(executable), link);
     }
     void start(int pid, const std::string& executable, int parent = 1, const std::string& unit = "") const {
-        writeStat(pid, parent, "1");
+        write("proc/" + std::to_string(pid) + "/stat", std::to_string(pid) + " (x) S " +
+                                                           std::to_string(parent) +
+                                                           " 0 0 0 0 0 0 0 0 0 0 0 0 0 20 0 1 0 77 0\n");
         write("proc/" + std::to_string(pid) + "/cgroup", "0::/" + unit + "\n");
         write(executable, "");
         setExecutable(pid, executable);
@@ -174,12 +171,11 @@ TEST_F(ApplicationOfProcess, IsLookedAtAgainUntilItHasRunOneProgramForTenSeconds
     EXPECT_EQ(idInWalk(), "draw");
     write("proc/uptime", "10.78 0\n");
     EXPECT_EQ(idInWalk(), "draw");
-    setExecutable(10, "usr/bin/play");
-    EXPECT_EQ(idInWalk(), "draw") << "known: not read again";
+    start(10, "usr/bin/draw", 1, "app-play.service");
     fs::remove(path("data/applications/draw.desktop"));
     clock.advance(100ms);
-    EXPECT_FALSE(idInWalk()) << "the entries are looked up each time";
-    writeStat(10, 1, "2");
+    EXPECT_FALSE(idInWalk()) << "known, and not read again; but the entries are looked up each time";
+    setExecutable(10, "usr/bin/play");
     EXPECT_EQ(idInWalk(), "play") << "it has executed another program";
 }
 

@@ -1,15 +1,20 @@
 #include "app/SMAgentPort.h"
 
+#include "app/SMOptions.h"
+#include "lib/ipc/KXIPCContext.h"
 #include "lib/ipc/KXIPCEnvelope.h"
 #include "lib/ipc/KXIPCMessage.h"
 #include "lib/plist/Binary.h"
+#include "lib/plist/Value.h"
 #include "platform/MessagePort.h"
 #include "platform/ProcessTable.h"
 
 #include <algorithm>
 #include <chrono>
+#include <functional>
 #include <iterator>
 #include <string>
+#include <string_view>
 #include <utility>
 
 namespace {

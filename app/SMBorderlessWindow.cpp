@@ -10,7 +10,7 @@
 namespace {
 
 /// Of the process, not of the window: a second window gets no filter.
-bool windowFilterAdded = false;
+bool windowFilterAdded = false; // NOLINT(*-non-const-global-variables)
 
 } // namespace
 

@@ -6,7 +6,6 @@
 #include "lib/plist/Value.h"
 
 #include <QString>
-
 #include <algorithm>
 #include <cstddef>
 #include <cstdint>

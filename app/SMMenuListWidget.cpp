@@ -3,6 +3,7 @@
 #include "app/SMMenuCollectionView.h"
 #include "app/SMMenuHostWidget.h"
 #include "lib/base/Geometry.h"
+#include "platform/Clock.h"
 
 #include <QPaintEvent>
 #include <QPainter>

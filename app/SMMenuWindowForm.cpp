@@ -19,16 +19,18 @@
 #include "app/menuPainter.h"
 #include "app/menuShortcuts.h"
 #include "lib/base/Geometry.h"
-#include "platform/UserDefaults.h"
+#include "platform/Clock.h"
 #include "platform/WindowServer.h"
 #include "ui_menuWindow.h"
 
 #include <QLayout>
 #include <QStringList>
+#include <cstddef>
 #include <cstdint>
 #include <functional>
 #include <initializer_list>
 #include <memory>
+#include <optional>
 #include <string>
 #include <utility>
 #include <vector>

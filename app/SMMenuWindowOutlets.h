@@ -10,7 +10,7 @@
 #include <vector>
 
 class SMMenuButton;
-class SMMenuCollectionView;
+class SMMenuCollectionView; // NOLINT(*-virtual-class-destructor): it is final
 
 /// The parts of the window whose place the window controller asks for.
 enum class SMMenuArea : std::uint8_t {

@@ -2,6 +2,10 @@
 
 #include <algorithm>
 #include <iterator>
+#include <optional>
+#include <span>
+#include <string>
+#include <string_view>
 
 namespace {
 

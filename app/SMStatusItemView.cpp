@@ -6,7 +6,6 @@
 #include <QPainter>
 #include <QPalette>
 #include <QSvgRenderer>
-
 #include <cmath>
 #include <string>
 

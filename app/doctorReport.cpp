@@ -1,6 +1,8 @@
 #include "app/doctorReport.h"
+#include "platform/Findings.h"
 
 #include <cstddef>
+#include <string>
 
 namespace {
 

@@ -1,13 +1,17 @@
 #include "app/menuAccessibility.h"
 
 #include "app/SMMenuButtonWidget.h"
+#include "app/SMMenuCollectionView.h"
+#include "app/SMMenuItem.h"
 #include "app/SMMenuListWidget.h"
 #include "app/SMThemeView.h"
+#include "app/menuRow.h"
 
 #include <QAccessible>
 #include <QAccessibleWidget>
 #include <algorithm>
-#include <utility>
+#include <cstddef>
+#include <memory>
 #include <vector>
 
 namespace {

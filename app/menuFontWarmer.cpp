@@ -1,6 +1,6 @@
 #include "app/menuFontWarmer.h"
 
-#include "app/SMMenuItem.h"
+#include "app/SMMenuItem.h" // IWYU pragma: keep
 #include "app/SMMenuModel.h"
 #include "platform/MainLoop.h"
 

@@ -1,5 +1,6 @@
 #include "app/menuShortcuts.h"
 
+#include "app/SMSearchField.h"
 #include "ui_menuWindow.h"
 
 #include <QAction>

@@ -4,7 +4,7 @@
 
 class QWidget;
 namespace Ui {
-class menuWindow;
+class menuWindow; // NOLINT(*-identifier-naming): the form's name
 }
 
 struct MenuShortcutActions {

@@ -2,6 +2,7 @@
 #include "lib/base/Log.h"
 #include "lib/ipc/KXIPCContext.h"
 #include "lib/ipc/KXIPCNames.h"
+#include "platform/LaunchServices.h"
 #include "platform/linux/GioLaunchServices.h"
 #include "platform/linux/LinuxPorts.h"
 #include "platform/linux/PrivateDirectory.h"
@@ -23,7 +24,6 @@
 
 #include <QGuiApplication>
 #include <QtGlobal>
-
 #include <algorithm>
 #include <cstdio>
 #include <cstdlib>

@@ -1,11 +1,11 @@
 #include "lib/raster/avx2.h"
 #include "lib/raster/pixel.h"
+#include "lib/raster/rasterops.h"
 #include "lib/raster/rowops.h"
 
 #include <algorithm>
 #include <cstddef>
 #include <cstdint>
-#include <new>
 #include <span>
 
 namespace raster::avx2 {

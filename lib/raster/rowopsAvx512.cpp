@@ -1,11 +1,13 @@
 #include "lib/raster/avx512.h"
 #include "lib/raster/pixel.h"
+#include "lib/raster/rasterops.h"
 #include "lib/raster/rowops.h"
 
 #include <algorithm>
 #include <bit>
 #include <cstddef>
 #include <cstdint>
+#include <span>
 
 namespace raster::avx512 {
 

@@ -6,6 +6,7 @@
 #include "platform/linux/Descriptor.h"
 #include "platform/linux/PortNames.h"
 #include "platform/linux/PortPacket.h"
+#include "platform/linux/PortTap.h"
 #include "platform/linux/SealedMemory.h"
 
 #include <algorithm>
@@ -21,6 +22,8 @@
 #include <span>
 #include <string>
 #include <sys/ioctl.h>
+#include <sys/socket.h>
+#include <unistd.h>
 #include <utility>
 
 namespace platform {

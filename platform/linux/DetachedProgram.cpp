@@ -13,7 +13,6 @@
 #include <string>
 #include <string_view>
 #include <unistd.h>
-#include <utility>
 #include <vector>
 
 namespace platform {

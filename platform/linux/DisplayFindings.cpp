@@ -1,6 +1,8 @@
 #include "platform/linux/DisplayFindings.h"
 
+#include "platform/Findings.h"
 #include "platform/linux/NotifierHost.h"
+#include "platform/linux/XcbCalls.h"
 #include "platform/linux/XcbConnection.h"
 #include "platform/linux/XcbPanel.h"
 #include "platform/linux/XcbTray.h"
@@ -8,10 +10,12 @@
 #include <QDBusConnection>
 #include <QDBusInterface>
 #include <QGuiApplication>
+#include <cstddef>
 #include <cstdint>
 #include <memory>
 #include <string>
 #include <xcb/xcb.h>
+#include <xcb/xproto.h>
 
 namespace platform {
 

@@ -10,7 +10,6 @@
 #include <vector>
 #include <xcb/res.h>
 #include <xcb/xcb.h>
-#include <xcb/xcbext.h>
 #include <xcb/xproto.h>
 
 namespace platform {

@@ -11,7 +11,6 @@
 #include <optional>
 #include <span>
 #include <vector>
-#include <xcb/xcb.h>
 #include <xcb/xproto.h>
 
 namespace platform {

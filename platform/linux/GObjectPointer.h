@@ -1,7 +1,6 @@
 #pragma once
 
 #include <gio/gio.h>
-
 #include <memory>
 #include <string>
 

@@ -8,7 +8,6 @@
 #include "platform/linux/GObjectPointer.h"
 #include "platform/linux/MessageBus.h"
 
-#include <algorithm>
 #include <cstdlib>
 #include <filesystem>
 #include <gio/gdesktopappinfo.h>

@@ -50,7 +50,7 @@ class NotifierItem final : public QObject {
     Q_PROPERTY(bool ItemIsMenu MEMBER m_itemIsMenu CONSTANT)
 
 public:
-    enum class Click { Main, Context };
+    enum class Click { main, context };
 
     NotifierItem(QString identifier, QString title, std::function<void(Click, QPoint)> clicked);
 
@@ -58,14 +58,16 @@ public:
     void setIconPixmap(NotifierPixmaps pixmaps); ///< tells the host when they are others
     NotifierToolTip toolTip() const { return {{}, {}, m_title, {}}; }
 
+    // NOLINTBEGIN(readability-identifier-naming): the protocol's names
 public Q_SLOTS:
-    void Activate(int x, int y) { m_clicked(Click::Main, {x, y}); }
-    void SecondaryActivate(int x, int y) { m_clicked(Click::Main, {x, y}); }
-    void ContextMenu(int x, int y) { m_clicked(Click::Context, {x, y}); }
+    void Activate(int x, int y) { m_clicked(Click::main, {x, y}); }
+    void SecondaryActivate(int x, int y) { m_clicked(Click::main, {x, y}); }
+    void ContextMenu(int x, int y) { m_clicked(Click::context, {x, y}); }
     void Scroll(int /*delta*/, const QString& /*orientation*/) {}
 
 Q_SIGNALS:
     void NewIcon();
+    // NOLINTEND(readability-identifier-naming)
 
 private:
     QString m_category = QStringLiteral("ApplicationStatus");

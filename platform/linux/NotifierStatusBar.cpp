@@ -98,7 +98,7 @@ private:
     void clicked(NotifierItem::Click click, QPoint at) {
         // Hosts that do not know the place say 0, 0; only the corner itself is truly there.
         if (!at.isNull() || QCursor::pos().isNull()) m_click = at;
-        if (click == NotifierItem::Click::Context)
+        if (click == NotifierItem::Click::context)
             m_view.rightMouseDown();
         else
             m_view.mouseDown();

@@ -1,6 +1,8 @@
 #include "platform/linux/PanelPlacement.h"
+#include "lib/base/Geometry.h"
 
 #include <algorithm>
+#include <optional>
 
 namespace platform {
 

@@ -1,10 +1,12 @@
 #include "platform/linux/PlaceFindings.h"
 
+#include "platform/Findings.h"
 #include "platform/linux/Descriptor.h"
 
 #include <cerrno>
 #include <cstring>
 #include <filesystem>
+#include <string>
 #include <sys/statvfs.h>
 #include <sys/syscall.h>
 #include <system_error>

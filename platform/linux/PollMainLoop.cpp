@@ -2,7 +2,11 @@
 #include "platform/Clock.h"
 #include "platform/MainLoop.h"
 
+#include <algorithm>
+#include <array>
 #include <chrono>
+#include <climits>
+#include <cstddef>
 #include <cstdint>
 #include <functional>
 #include <iterator>
@@ -14,10 +18,6 @@
 #include <span>
 #include <sys/epoll.h>
 #include <sys/eventfd.h>
-
-#include <algorithm>
-#include <array>
-#include <climits>
 #include <utility>
 #include <vector>
 

@@ -1,5 +1,6 @@
 #include "platform/linux/PortLeftovers.h"
 
+#include "lib/base/ParseNumber.h"
 #include "platform/ProcessTable.h"
 #include "platform/linux/Descriptor.h"
 #include "platform/linux/PeerIdentity.h"
@@ -7,14 +8,11 @@
 #include <cstdint>
 #include <dirent.h>
 #include <fcntl.h>
+#include <memory>
 #include <optional>
 #include <string>
-#include <sys/file.h>
-
-#include <charconv>
-#include <memory>
 #include <string_view>
-#include <system_error>
+#include <sys/file.h>
 #include <unistd.h>
 #include <vector>
 
@@ -29,9 +27,7 @@ std::optional<std::uint32_t> TakeNumber(std::string_view& name) {
     const auto dot = name.rfind('.');
     if (dot == name.npos) return std::nullopt;
     std::uint32_t number = 0;
-    const char* end = name.data() + name.size();
-    const auto result = std::from_chars(name.data() + dot + 1, end, number);
-    if (result.ec != std::errc() || result.ptr != end) return std::nullopt;
+    if (!ParseNumber(name.substr(dot + 1), number)) return std::nullopt;
     name = name.substr(0, dot);
     return number;
 }

@@ -5,6 +5,9 @@
 #include "platform/linux/PortLeftovers.h"
 #include "platform/linux/PrivateDirectory.h"
 
+#include <algorithm>
+#include <cerrno>
+#include <cstring>
 #include <fcntl.h>
 #include <memory>
 #include <optional>
@@ -13,10 +16,6 @@
 #include <sys/file.h>
 #include <sys/socket.h>
 #include <sys/un.h>
-
-#include <algorithm>
-#include <cerrno>
-#include <cstring>
 #include <unistd.h>
 #include <utility>
 #include <vector>

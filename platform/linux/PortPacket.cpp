@@ -4,21 +4,20 @@
 #include "platform/linux/Descriptor.h"
 #include "platform/linux/SealedMemory.h"
 
+#include <algorithm>
 #include <array>
+#include <bit>
+#include <cerrno>
+#include <chrono>
+#include <climits>
 #include <cstddef>
 #include <cstdint>
+#include <cstring>
 #include <memory>
 #include <optional>
 #include <sys/socket.h>
 #include <sys/types.h>
 #include <sys/uio.h>
-
-#include <algorithm>
-#include <bit>
-#include <cerrno>
-#include <chrono>
-#include <climits>
-#include <cstring>
 #include <utility>
 #include <vector>
 

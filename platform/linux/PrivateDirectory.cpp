@@ -3,13 +3,12 @@
 #include "lib/base/Log.h"
 #include "platform/linux/Descriptor.h"
 
-#include <fcntl.h>
-#include <string>
-#include <sys/stat.h>
-
 #include <cerrno>
 #include <cstdlib>
 #include <cstring>
+#include <fcntl.h>
+#include <string>
+#include <sys/stat.h>
 #include <unistd.h>
 
 namespace platform {

@@ -13,6 +13,7 @@
 #include <iterator>
 #include <memory>
 #include <optional>
+#include <signal.h>
 #include <string>
 #include <string_view>
 #include <sys/syscall.h>

@@ -1,6 +1,7 @@
 #include "platform/linux/QtWindowServer.h"
 
 #include "lib/base/Geometry.h"
+#include "platform/MainLoop.h"
 #include "platform/WindowServer.h"
 #include "platform/linux/PanelPlacement.h"
 #include "platform/linux/QtScreenCoordinates.h"

@@ -2,6 +2,9 @@
 #include "lib/base/SharedBytes.h"
 #include "platform/linux/Descriptor.h"
 
+#include <algorithm>
+#include <cerrno>
+#include <climits>
 #include <cstddef>
 #include <fcntl.h>
 #include <memory>
@@ -10,10 +13,6 @@
 #include <sys/mman.h>
 #include <sys/stat.h>
 #include <sys/uio.h>
-
-#include <algorithm>
-#include <cerrno>
-#include <climits>
 #include <utility>
 #include <vector>
 

@@ -71,9 +71,9 @@ private:
         if (!isXcb(eventType)) return false;
         const auto event = XcbReadTrayEvent(message);
         if (!event || event->window != m_widget.id()) return false;
-        if (event->kind == XcbTrayEvent::Kind::TakenIn) takenIn();
+        if (event->kind == XcbTrayEvent::Kind::takenIn) takenIn();
         // Thrown out, or its host died: as a window of its own it would stand somewhere on the screen.
-        if (event->kind == XcbTrayEvent::Kind::MovedOut && m_isDocked) {
+        if (event->kind == XcbTrayEvent::Kind::movedOut && m_isDocked) {
             m_widget.hide();
             giveUpHost();
         }
@@ -120,8 +120,8 @@ bool TrayStatusBar::nativeEventFilter(const QByteArray& eventType, void* message
     if (!isXcb(eventType)) return false;
     const auto event = XcbReadTrayEvent(message);
     if (!event) return false;
-    const bool isEndOfTray = event->kind == XcbTrayEvent::Kind::Destroyed && event->window == m_tray;
-    if (isEndOfTray || event->kind == XcbTrayEvent::Kind::NewTray) lookForTray();
+    const bool isEndOfTray = event->kind == XcbTrayEvent::Kind::destroyed && event->window == m_tray;
+    if (isEndOfTray || event->kind == XcbTrayEvent::Kind::newTray) lookForTray();
     return false;
 }
 

@@ -4,28 +4,29 @@
 #include "platform/Clock.h"
 #include "platform/MessagePort.h"
 #include "platform/linux/Backlog.h"
+#include "platform/linux/Descriptor.h"
 #include "platform/linux/IncomingConnection.h"
 #include "platform/linux/PeerIdentity.h"
 #include "platform/linux/PortNames.h"
 #include "platform/linux/PortPacket.h"
-
-#include <cstddef>
-#include <cstdint>
-#include <fcntl.h>
-#include <functional>
-#include <memory>
-#include <mutex>
-#include <optional>
-#include <sys/epoll.h>
-#include <sys/eventfd.h>
+#include "platform/linux/PortTap.h"
 
 #include <algorithm>
 #include <array>
 #include <cerrno>
+#include <cstddef>
+#include <cstdint>
+#include <fcntl.h>
+#include <memory>
+#include <mutex>
+#include <optional>
 #include <span>
+#include <sys/epoll.h>
+#include <sys/eventfd.h>
 #include <sys/socket.h>
 #include <unistd.h>
 #include <utility>
+#include <vector>
 
 namespace platform {
 
@@ -169,7 +170,7 @@ void UnixLocalPort::pause(std::uint64_t tag) {
 }
 
 void UnixLocalPort::resumePaused() {
-    eventfd_t ignored;
+    eventfd_t ignored = 0;
     eventfd_read(m_wake->get(), &ignored);
     const std::lock_guard lock(m_mutex);
     std::erase_if(m_paused, [this](std::uint64_t tag) {

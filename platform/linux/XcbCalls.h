@@ -10,9 +10,9 @@
 namespace platform {
 
 struct XcbFreed {
-    void operator()(void* memory) const {
-        std::free(memory);
-    } // NOLINT(*-no-malloc): xcb's replies ask for it
+    void operator()(void* reply) const {
+        std::free(reply); // NOLINT(*-no-malloc): as xcb asks for
+    }
 };
 template <typename T>
 using XcbReply = std::unique_ptr<T, XcbFreed>;

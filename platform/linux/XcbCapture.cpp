@@ -1,6 +1,7 @@
 #include "platform/linux/XcbCapture.h"
 
 #include "platform/linux/Descriptor.h"
+#include "platform/linux/XcbCalls.h"
 #include "platform/linux/XcbConnection.h"
 
 #include <cstddef>
@@ -8,11 +9,10 @@
 #include <cstdlib>
 #include <memory>
 #include <sys/mman.h>
-#include <sys/types.h>
 #include <unistd.h>
-#include <utility>
 #include <xcb/shm.h>
 #include <xcb/xcb.h>
+#include <xcb/xproto.h>
 
 namespace platform {
 

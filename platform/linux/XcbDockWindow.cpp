@@ -1,5 +1,6 @@
 #include "platform/linux/XcbDockWindow.h"
 
+#include "platform/linux/XcbCalls.h"
 #include "platform/linux/XcbConnection.h"
 
 #include <QWidget>

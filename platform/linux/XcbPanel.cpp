@@ -1,5 +1,7 @@
 #include "platform/linux/XcbPanel.h"
 
+#include "platform/MainLoop.h"
+#include "platform/linux/XcbCalls.h"
 #include "platform/linux/XcbConnection.h"
 
 #include <QGuiApplication>

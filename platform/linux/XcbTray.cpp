@@ -1,6 +1,7 @@
 #include "platform/linux/XcbTray.h"
 
 #include "lib/base/Geometry.h"
+#include "platform/linux/XcbCalls.h"
 #include "platform/linux/XcbConnection.h"
 
 #include <cstdint>
@@ -123,14 +124,14 @@ std::optional<XcbTrayEvent> XcbReadTrayEvent(const void* nativeEvent) {
         const auto* event = static_cast<const xcb_client_message_event_t*>(nativeEvent);
         if (event->type != XcbAtom(c, "MANAGER") || event->data.data32[1] != XcbAtom(c, traySelection))
             return {};
-        return XcbTrayEvent{Kind::NewTray, event->data.data32[2]};
+        return XcbTrayEvent{Kind::newTray, event->data.data32[2]};
     }
     case XCB_DESTROY_NOTIFY:
-        return XcbTrayEvent{Kind::Destroyed,
+        return XcbTrayEvent{Kind::destroyed,
                             static_cast<const xcb_destroy_notify_event_t*>(nativeEvent)->window};
     case XCB_REPARENT_NOTIFY: {
         const auto* event = static_cast<const xcb_reparent_notify_event_t*>(nativeEvent);
-        return XcbTrayEvent{event->parent == XcbRootWindow(c) ? Kind::MovedOut : Kind::TakenIn,
+        return XcbTrayEvent{event->parent == XcbRootWindow(c) ? Kind::movedOut : Kind::takenIn,
                             event->window};
     }
     default:

@@ -26,7 +26,7 @@ KXRect XcbFrameOnDesktop(std::uint32_t window);
 QImage XcbTrayBackground(std::uint32_t window);
 
 struct XcbTrayEvent {
-    enum class Kind { NewTray, Destroyed, MovedOut, TakenIn };
+    enum class Kind { newTray, destroyed, movedOut, takenIn };
     Kind kind;
     std::uint32_t window; ///< of which this is said
 };

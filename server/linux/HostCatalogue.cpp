@@ -5,12 +5,11 @@
 #include "server/catalogues/Catalogue.h"
 #include "server/catalogues/Categories.h"
 
-#include <cstddef>
-#include <gio/gdesktopappinfo.h>
-
 #include <QtGlobal>
 #include <algorithm>
+#include <cstddef>
 #include <filesystem>
+#include <gio/gdesktopappinfo.h>
 #include <gio/gio.h>
 #include <glib.h>
 #include <memory>

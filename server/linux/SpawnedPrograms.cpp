@@ -2,6 +2,8 @@
 
 #include "lib/base/Log.h"
 
+#include <cerrno>
+#include <cstring>
 #include <optional>
 #include <spawn.h>
 #include <stdlib.h>
@@ -9,9 +11,6 @@
 #include <sys/wait.h>
 #include <time.h>
 #include <unistd.h>
-
-#include <cerrno>
-#include <cstring>
 
 namespace tessel {
 

@@ -43,7 +43,7 @@ struct HostilePackets : testing::Test {
             peer->trySend(packet);
         peer->trySend(RawHeader(last));
         PacketHeader answer;
-        ssize_t length;
+        ssize_t length = 0;
         do
             length = peer->receive(&answer, sizeof answer);
         while (length > 0 && answer.sequence != last.sequence);

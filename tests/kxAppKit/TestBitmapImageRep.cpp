@@ -16,12 +16,12 @@ using Interpolation = KXImageInterpolation;
 
 Bitmap::Pointer bitmap(int wide, int high, KXBitmapFormat format = 0, const Bytes& pixel = {}) {
     auto made = Bitmap::imageRepWith32bitBuffer(nullptr, wide, high, format, 0);
-    for (int i = 0; !pixel.empty() && i < wide * high; ++i)
+    for (std::ptrdiff_t i = 0; !pixel.empty() && i < std::ptrdiff_t{wide} * high; ++i)
         std::copy(pixel.begin(), pixel.end(), made->bitmapData() + i * 4);
     return made;
 }
 
-Bytes pixelAt(const Bitmap& from, int x, int y) {
+Bytes pixelAt(const Bitmap& from, std::ptrdiff_t x, std::ptrdiff_t y) {
     const std::uint8_t* const p = from.bitmapData() + y * from.bytesPerRow() + x * 4;
     return {p, p + 4};
 }

@@ -47,7 +47,7 @@ TEST(Image, KeepsTheValidIconsOfARawSet) {
     const ScratchHome home;
     const auto image = KXImage::imageWithRawIcons(
         plist::Array{rawIcon(16, 16, 1024), rawIcon(2, 2, 16, "BGRA"), rawIcon(2, 2, 15), rawIcon(2, 2, 17),
-                     rawIcon(0, 0, 0), rawIcon(0x40000001, 1, 4), rawIcon(65536, 65537, 65536 * 4),
+                     rawIcon(0, 0, 0), rawIcon(0x40000001, 1, 4), rawIcon(65536, 65537, 0x40000),
                      plist::Dictionary{}, rawIcon(32, 32, 4096)});
     ASSERT_TRUE(image);
     EXPECT_EQ(image->size(), (KXSize{32, 32}));
@@ -231,9 +231,9 @@ TEST(IconFamily, HoldsTheSizesThatTheImageAllows) {
 
 TEST(IconFamily, FramesWhatHasToGrow) {
     const auto elements = elementsOf(square(16)->icnsData());
-    const std::byte* const middle = elements.at("ic07").data() + 64 * 128 * 4;
+    const std::byte* const middle = elements.at("ic07").data() + std::ptrdiff_t{64} * 128 * 4;
     EXPECT_EQ(middle[0], std::byte{0}) << "the transparent frame is 7 pixels wide";
-    EXPECT_GT(middle[20 * 4], std::byte{245});
+    EXPECT_GT(middle[80], std::byte{245});
 }
 
 TEST(IconFamily, BadgesTheDocumentIcon) {

@@ -2,14 +2,12 @@
 
 #include "platform/linux/PortPacket.h"
 
-#include <gtest/gtest.h>
-
 #include <fcntl.h>
+#include <gtest/gtest.h>
 #include <poll.h>
+#include <string>
 #include <sys/mman.h>
 #include <sys/un.h>
-
-#include <string>
 #include <vector>
 
 /// What a peer may send, byte for byte.
@@ -60,7 +58,7 @@ public:
     /// Waits for the end of the connection; false when an answer comes instead, or nothing.
     bool isCutOff() {
         pollfd polled{m_socket.get(), POLLIN, 0};
-        char byte;
+        char byte = 0;
         return poll(&polled, 1, 20'000) == 1 && recv(m_socket.get(), &byte, 1, MSG_DONTWAIT) <= 0;
     }
 

@@ -1,9 +1,8 @@
 #include "platform/linux/TerminationSignals.h"
 #include "tests/support/ManualMainLoop.h"
 
-#include <gtest/gtest.h>
-
 #include <csignal>
+#include <gtest/gtest.h>
 
 namespace {
 

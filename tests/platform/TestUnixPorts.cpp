@@ -3,9 +3,8 @@
 #include "tests/platform/PortWorlds.h"
 #include "tests/platform/RawPeer.h"
 
-#include <gmock/gmock.h>
-
 #include <future>
+#include <gmock/gmock.h>
 #include <sys/stat.h>
 
 // What only the system's ports do: directories, other processes, queues, and peers that do not play by the

@@ -20,7 +20,8 @@ struct Picture {
         , bytesPerRow(w * pixel + slack)
         , bytes(static_cast<std::size_t>(bytesPerRow) * static_cast<std::size_t>(h)) {}
     std::uint8_t& at(int x, int y, int channel) {
-        return bytes[static_cast<std::size_t>(y * bytesPerRow + x * pixelBytes + channel)];
+        return bytes[static_cast<std::size_t>(y) * static_cast<std::size_t>(bytesPerRow) +
+                     static_cast<std::size_t>(x * pixelBytes + channel)];
     }
 };
 

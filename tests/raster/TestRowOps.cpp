@@ -15,7 +15,7 @@ namespace {
 TEST(RowOps, ColourArithmeticIsExact) {
     for (unsigned round = 0; round < 2 * 256; ++round) {
         const unsigned a = round / 2, alphaByte = round % 2 * 3;
-        Bytes row(256 * 4);
+        Bytes row(1024);
         for (unsigned i = 0; i < row.size(); ++i)
             row[i] = static_cast<std::uint8_t>(i % 4 == alphaByte ? a : i / 4);
         Bytes back = row, straight(row.size(), static_cast<std::uint8_t>(a * 7)), clear = straight;
@@ -23,20 +23,20 @@ TEST(RowOps, ColourArithmeticIsExact) {
         Raster_Multiply({clear.data(), 0, 256, 1}, {true, true}, row.data(), 0, {alphaByte == 0, true});
         Raster_Premultiply({row.data(), 0, 256, 1}, static_cast<int>(alphaByte));
         Raster_Unpremultiply({back.data(), 0, 256, 1}, static_cast<int>(alphaByte));
-        for (unsigned c = 0; c < 256; ++c) {
-            const unsigned m = (c * a + 127) / 255, t = a * 7 & 255;
+        for (std::size_t c = 0; c < 256; ++c) {
+            const std::size_t m = (c * a + 127) / 255, t = a * 7 & 255;
             ASSERT_EQ(row[c * 4 + 1], m);
-            ASSERT_EQ(back[c * 4 + 2], a == 0 ? 0 : std::min(255U, (c * 255 + a / 2) / a));
+            ASSERT_EQ(back[c * 4 + 2], a == 0 ? 0 : std::min<std::size_t>(255, (c * 255 + a / 2) / a));
             ASSERT_EQ(back[c * 4 + alphaByte], a);
             ASSERT_EQ(straight[c * 4 + 2], t - (t * (a - m) + 127) / 255);
-            ASSERT_EQ(clear[c * 4 + 2], t - (t * (a - std::min(a, c)) + 127) / 255);
+            ASSERT_EQ(clear[c * 4 + 2], t - (t * (a - std::min<std::size_t>(a, c)) + 127) / 255);
             ASSERT_TRUE(straight[c * 4 + 3] == t && clear[c * 4] == t) << "alpha stays";
         }
     }
 }
 
 TEST(RowOps, EverySumIsAveragedExactly) {
-    constexpr std::size_t sums = 32 * 254 + 4;
+    constexpr std::size_t largest = std::size_t{32} * 254, sums = largest + 4;
     std::vector<Bytes> bytes(BoxRun::maximum, Bytes(sums));
     const std::uint8_t* rows[BoxRun::maximum];
     for (unsigned row = 0; row < bytes.size(); rows[row] = bytes[row].data(), ++row)
@@ -48,7 +48,7 @@ TEST(RowOps, EverySumIsAveragedExactly) {
         for (const RowOps* ops : availableRowOps()) {
             Bytes averages(sums);
             ops->averageRows(averages.data(), rows, run, static_cast<std::uint32_t>(step), sums / 4);
-            for (std::size_t sum = 0; sum <= 32 * 254 && sum << 16 <= step * 255; ++sum)
+            for (std::size_t sum = 0; sum <= largest && sum << 16 <= step * 255; ++sum)
                 ASSERT_EQ(averages[sum], (sum << 16) / step) << ops->name << ", step " << step;
         }
 }

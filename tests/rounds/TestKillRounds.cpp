@@ -46,7 +46,7 @@ void ask(const std::string& directory, State& state) {
     Program program(directory);
     KXIPCClient client(program.context);
     observe(client, "pong", [&](const auto& note) {
-        const auto server = client.serverProcess();
+        const auto& server = client.serverProcess();
         const bool isMine = KXUserInfo(note)["client"].intValue() == getpid();
         if (isMine && server && server->isValid()) state.pair = pairOf(getpid(), server->pid());
     });

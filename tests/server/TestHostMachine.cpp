@@ -7,18 +7,16 @@
 #include "tests/support/ScratchComputer.h"
 
 #include <QImage>
-
+#include <future>
 #include <gio/gio.h>
 #include <gmock/gmock.h>
-
-#include <future>
 
 using namespace tessel;
 using testing::ElementsAre;
 
 namespace {
 
-platform::GioLaunchServices launching;
+platform::GioLaunchServices launching; // NOLINT(*-non-const-global-variables): it holds nothing
 
 std::string titles(const std::vector<CatalogueItem>& items) {
     std::string result;

@@ -4,9 +4,7 @@
 #include "tests/support/ScratchHome.h"
 
 #include <QImage>
-
 #include <gmock/gmock.h>
-
 #include <set>
 
 using namespace tessel;

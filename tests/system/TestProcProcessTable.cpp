@@ -14,7 +14,7 @@ namespace fs = std::filesystem;
 
 namespace {
 
-platform::SystemClock systemClock;
+const platform::SystemClock systemClock;
 
 struct ProcProcessTable : testing::Test {
     bool walkFinds(int pid) const {

@@ -4,6 +4,7 @@
 #include "lib/kxAppKit/system/KXFileURL.h"
 #include "lib/plist/Value.h"
 #include "platform/ProcessTable.h"
+#include "platform/Status.h"
 #include "platform/Workspace.h"
 
 #include <cstdint>

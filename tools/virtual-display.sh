@@ -1,7 +1,8 @@
 # A private X server with a small window manager, a private session bus and a private runtime directory, and ways to
 # see and touch what is on it. Sourced by ./run and the end-to-end tests.
 
-# start_display WIDTHxHEIGHT: sets DISPLAY, DBUS_SESSION_BUS_ADDRESS and XDG_RUNTIME_DIR.
+# start_display WIDTHxHEIGHT: sets DISPLAY, DBUS_SESSION_BUS_ADDRESS and XDG_RUNTIME_DIR. $KX_WINDOW_MANAGER may be the
+# command of another window manager, which has settings of its own here.
 start_display() {
     display_dir=$(mktemp -d)
     display_pids=()
@@ -15,14 +16,15 @@ start_display() {
     export DBUS_SESSION_BUS_ADDRESS=unix:path=$XDG_RUNTIME_DIR/bus
     dbus-daemon --session --nofork --nopidfile --address="$DBUS_SESSION_BUS_ADDRESS" >/dev/null 2>&1 &
     display_pids+=($!)
-    openbox --sm-disable >/dev/null 2>&1 &
-    display_pids+=($!)
-    wait_until 20 window_manager_runs
+    XDG_CONFIG_HOME=$display_dir/config ${KX_WINDOW_MANAGER:-openbox --sm-disable} >/dev/null 2>&1 &
+    display_manager=$!
+    wait_until 60 window_manager_runs
     display -window root -size "$1" gradient:'#5f86a6-#1d2c3a' || true # answers 1 when it has drawn, too
 }
 
 stop_display() {
     local pid
+    kill -KILL "${display_manager:-}" 2>/dev/null || true # some do not end when the server does, or when they are asked
     for pid in $(jobs -p) "${display_pids[@]}"; do kill "$pid" 2>/dev/null || true; done
     wait 2>/dev/null || true
     rm -rf "$display_dir"

@@ -2,6 +2,7 @@
 
 #include "platform/linux/XcbCalls.h"
 
+#include <algorithm>
 #include <array>
 #include <cstddef>
 #include <cstdint>
@@ -21,6 +22,7 @@ constexpr std::array<const char*, EwmhDisplay::nameCount> names = {"_NET_ACTIVE_
                                                                    "_NET_CURRENT_DESKTOP",
                                                                    "_NET_NUMBER_OF_DESKTOPS",
                                                                    "_NET_DESKTOP_LAYOUT",
+                                                                   "_NET_SUPPORTED",
                                                                    "_NET_RESTACK_WINDOW",
                                                                    "_NET_WM_PID",
                                                                    "_NET_WM_DESKTOP",
@@ -108,6 +110,17 @@ EwmhDisplay::Numbers EwmhDisplay::processesByConnection(std::span<const xcb_wind
 void EwmhDisplay::request(xcb_window_t window, Name message, std::uint32_t detail) const {
     constexpr std::uint32_t sourcePager = 2; // an "application" may be refused
     XcbSendToRoot(m_connection.get(), window, names[message], {sourcePager, XCB_CURRENT_TIME, detail, 0, 0});
+}
+
+void EwmhDisplay::raise(std::span<const xcb_window_t> windows) const {
+    const std::uint32_t above = XCB_STACK_MODE_ABOVE;
+    const auto known = numbersOfRoot(supported);
+    const bool isKnown = std::ranges::find(known, atom(restackWindow)) != known.end();
+    for (const auto window : windows)
+        if (isKnown)
+            request(window, restackWindow, above);
+        else // it gets to hear of this as of a wish of the window's own
+            xcb_configure_window(m_connection.get(), window, XCB_CONFIG_WINDOW_STACK_MODE, &above);
 }
 
 void EwmhDisplay::finish() const {

@@ -19,6 +19,7 @@ public:
         currentDesktop,
         numberOfDesktops,
         desktopLayout,
+        supported,
         restackWindow,
         windowProcess,
         windowDesktop,
@@ -47,6 +48,8 @@ public:
 
     /// Asks the window manager, as a pager does, for something about `window`.
     void request(xcb_window_t window, Name message, std::uint32_t detail) const;
+    /// Has the windows raised one after the other.
+    void raise(std::span<const xcb_window_t> windows) const;
     /// Waits until the server has taken what was asked for. It forgets the rest when we disconnect.
     void finish() const;
 

@@ -63,9 +63,7 @@ Status EwmhWorkspace::bringToFront(int pid, ProcessWindows which) const {
     const auto windows =
         WindowsToRaise(FactsOf(display, WindowsOf(display, static_cast<std::uint32_t>(pid))));
     if (windows.empty()) return status::processHasNoWindow;
-    if (which == ProcessWindows::all)
-        for (const auto window : windows)
-            display.request(window, EwmhDisplay::restackWindow, XCB_STACK_MODE_ABOVE);
+    if (which == ProcessWindows::all) display.raise(windows);
     display.request(windows.back(), EwmhDisplay::activeWindow, XCB_WINDOW_NONE);
     display.finish();
     return status::success;

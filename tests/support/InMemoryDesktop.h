@@ -13,13 +13,9 @@ struct InMemoryDesktop {
         int front = 0;
         unsigned desktop = 0;
         platform::Status error = platform::status::success;
-        mutable std::vector<std::pair<int, platform::ProcessWindows>> broughtToFront;
 
         int frontProcessID() const override { return front; }
-        platform::Status bringToFront(int pid, platform::ProcessWindows which) const override {
-            broughtToFront.emplace_back(pid, which);
-            return error;
-        }
+        platform::Status bringToFront(int, platform::ProcessWindows) const override { return error; }
         platform::Status currentDesktop(unsigned& number) const override {
             number = desktop;
             return error;

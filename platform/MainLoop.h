@@ -30,7 +30,8 @@ public:
                                                              Task task) = 0;
 
     /// Runs the task whenever the descriptor has something to read. The descriptor stays the caller's, and
-    /// must outlive the handle.
+    /// must outlive the handle: once it is closed, its number may be another's, who would no longer be heard.
+    /// So where both are members, the handle is declared after the descriptor.
     [[nodiscard]] virtual std::unique_ptr<Handle> watchReadable(int descriptor, Task task) = 0;
 };
 

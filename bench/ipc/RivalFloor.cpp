@@ -66,7 +66,7 @@ public:
     }
 
 private:
-    static constexpr std::size_t inlineLimit = std::size_t{128} << 10;
+    static constexpr std::size_t inlineLimit = std::size_t{256} << 10;
     struct Header {
         std::uint64_t size;
         std::uint64_t waits;

@@ -24,8 +24,8 @@ namespace platform {
 
 namespace {
 
-// Room for a few packets of the inline size, whatever the system's default is.
-constexpr int sendBufferSize = 256 * 1024;
+// Room for two packets of the inline size, where the system grants it.
+constexpr int sendBufferSize = 512 * 1024;
 
 Descriptor NewSocket() {
     return Descriptor(socket(AF_UNIX, SOCK_SEQPACKET | SOCK_CLOEXEC | SOCK_NONBLOCK, 0));

@@ -33,7 +33,7 @@ struct PacketHeader {
 static_assert(sizeof(PacketHeader) == 24);
 
 /// More than this goes through memory.
-constexpr std::size_t maximalInlinePayload = std::size_t{128} << 10;
+constexpr std::size_t maximalInlinePayload = std::size_t{256} << 10;
 /// How much goes inline where the system grants no larger send buffer than this.
 constexpr std::size_t InlineLimit(int sendBuffer) {
     constexpr std::size_t overhead = 32 + sizeof(PacketHeader); // the system's own, and ours

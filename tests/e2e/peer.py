@@ -11,7 +11,7 @@ from desktop import wait_until
 
 HEADER = struct.Struct("<4sHHQQ")
 WAITS, ANSWER, IN_MEMORY = 1, 2, 4
-MOST_INLINE = 128 * 1024
+MOST_INLINE = 256 * 1024
 SEALS = fcntl.F_SEAL_SEAL | fcntl.F_SEAL_SHRINK | fcntl.F_SEAL_GROW | fcntl.F_SEAL_WRITE
 SERVER = "com.corvane.kxipc.server2"
 
@@ -64,6 +64,7 @@ class Peer:
                                   "synchronous": synchronous}, fmt=plistlib.FMT_BINARY)
         if port not in self.connections:
             self.connections[port] = socket.socket(socket.AF_UNIX, socket.SOCK_SEQPACKET)
+            self.connections[port].setsockopt(socket.SOL_SOCKET, socket.SO_SNDBUF, 2 * MOST_INLINE)
             self.connections[port].connect(self.path(port))
         connection, flags = self.connections[port], WAITS if synchronous else 0
         if len(payload) <= MOST_INLINE:

@@ -22,6 +22,8 @@ class RawPeer {
 public:
     RawPeer(const std::string& directory, const std::string& name)
         : m_socket(socket(AF_UNIX, SOCK_SEQPACKET | SOCK_CLOEXEC, 0)) {
+        const int room = 2 * platform::maximalInlinePayload;
+        setsockopt(m_socket.get(), SOL_SOCKET, SO_SNDBUF, &room, sizeof room);
         sockaddr_un address = {};
         address.sun_family = AF_UNIX;
         (directory + '/' + name).copy(address.sun_path, sizeof address.sun_path - 1);

@@ -68,7 +68,10 @@ public:
         QObject::connect(qGuiApp, &QGuiApplication::aboutToQuit, &m_connections,
                          [this] { m_controller.applicationWillTerminate(); });
     }
-    ~Agent() { KXFileTypeIcons::setSource(nullptr); }
+    ~Agent() {
+        running = nullptr;
+        KXFileTypeIcons::setSource(nullptr);
+    }
     Agent(const Agent&) = delete;
     Agent& operator=(const Agent&) = delete;
 
@@ -80,6 +83,11 @@ public:
         // Before the loop turns, and with it before anybody's command is obeyed.
         m_controller.applicationWillFinishLaunching();
         m_controller.applicationDidFinishLaunching();
+        running = this;
+        // When the display dies the toolkit exits, from wherever it notices.
+        std::atexit([] {
+            if (running) running->end();
+        });
         return true;
     }
 
@@ -99,13 +107,20 @@ private:
         }
     }
 
-    [[noreturn]] void terminate() {
+    void end() {
         m_controller.applicationWillTerminate();
         m_port.reset();
         m_ports.reset(); // sends what still waits
+    }
+
+    [[noreturn]] void terminate() {
+        end();
         // Returning to main would look better: but nothing that called this, however deep, shall go on.
         std::_Exit(EXIT_SUCCESS);
     }
+
+    static inline Agent* running =
+        nullptr; // NOLINT(*-avoid-non-const-global-variables): what exits knows no object
 
     platform::SystemClock m_clock;
     platform::QtMainLoop m_mainLoop;

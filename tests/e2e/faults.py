@@ -19,6 +19,7 @@ ITEM = Window("Tessel status item")
 PANEL = Window("Tessel start menu")
 BIN = os.environ["KX_TEST_BIN"]
 AGENT = "corvane-tesselStartMenu"
+PORT = "com.corvane.tesselStartMenu"
 
 
 class Faults(unittest.TestCase):
@@ -151,6 +152,7 @@ class Faults(unittest.TestCase):
             self.end(server, signal.SIGKILL)
             wait_until("the agent to end", lambda: self.ask("--show")[0] == 1)
             wait_until("the agent to be missed", lambda: "exit code 1" in self.log("tesselDaemon"))
+            self.assertEqual(glob.glob(f"{self.environment['XDG_RUNTIME_DIR']}/*/{PORT}"), [], "it ended in order")
         self.assertNotIn("signal", self.log("tesselDaemon"))
         wait_until("it to say why", lambda: "Cannot run: there is no display" in self.log(), 90)
         self.assertEqual(glob.glob(self.home + "/core*"), [])

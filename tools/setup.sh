@@ -9,7 +9,8 @@ RUN_PACKAGES=(qt6-qpa-plugins libqt6svg6 shared-mime-info)
 TEST_PACKAGES=(libgtest-dev libgmock-dev python3 clang-format codespell desktop-file-utils at-spi2-core
     python3-pyatspi)
 # Desktops of others, for the slow tests.
-DESKTOP_PACKAGES=(x11-xserver-utils trayer tint2 lxqt-panel xfwm4 kwin-x11 picom sway xwayland wtype grim)
+DESKTOP_PACKAGES=(x11-xserver-utils trayer tint2 lxqt-panel xfwm4 kwin-x11 picom sway xwayland wtype grim
+    ibus)
 
 say() { printf '%s\n' "$*"; }
 

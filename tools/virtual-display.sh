@@ -18,6 +18,7 @@ start_display() {
     display_pids+=($!)
     XDG_CONFIG_HOME=$display_dir/config ${KX_WINDOW_MANAGER:-openbox --sm-disable} >/dev/null 2>&1 &
     display_manager=$!
+    disown
     wait_until 60 window_manager_runs
     display -window root -size "$1" gradient:'#5f86a6-#1d2c3a' || true # answers 1 when it has drawn, too
 }

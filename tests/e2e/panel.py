@@ -43,12 +43,10 @@ class Panel(unittest.TestCase):
     def setUpClass(cls):
         cls.home = tempfile.TemporaryDirectory()
         os.environ.update(HOME=cls.home.name, XDG_DATA_HOME=cls.home.name + "/data",
-                          XDG_CONFIG_HOME=cls.home.name + "/config", QT_IM_MODULE="compose")
-        cls.write(".XCompose", '<dead_acute> <x> : "c"\n')
+                          XDG_CONFIG_HOME=cls.home.name + "/config")
         cls.write_entry("Calculator", "true")
         cls.write_entry("Opener", f"sh -c \"{' '.join(cls.watcher('opened', (740, 430)))} >{cls.home.name}/opened\"")
         cls.processes = []
-        run("setxkbmap", "us", "-variant", "intl")  # has dead keys
         if sys.argv[1:]:
             cls.start(*sys.argv[1:])
         if BLURS:  # not by itself where the processor draws
@@ -163,10 +161,6 @@ class Panel(unittest.TestCase):
         self.keeps_keyboard("opened")
         run("xdotool", "windowkill", opened)
         wait_until("its end", lambda: not Window("opened").is_open())
-
-    def test_an_input_method_composes_a_character(self):
-        self.show()
-        self.assertIn("Calculator", self.chooses("dead_acute", "x", *LETTERS[1:]))
 
     def test_closes_when_the_user_turns_to_something_else(self):
         two = Window("two").id()

@@ -164,8 +164,13 @@ const std::map<std::string, Job> jobs{
     {"stopped", Stopped},
 };
 const std::map<std::string, double (*)(const std::string&, std::size_t)> growths{
-    {"size", CostOfSize},     {"clients", CostOfClients},  {"observers", CostOfObservers},
-    {"inline", CostOfInline}, {"in memory", CostOfMemory},
+    {"size", CostOfSize},
+    {"clients", CostOfClients},
+    {"observers", CostOfObservers},
+    {"inline", CostOfInline},
+    {"in memory", CostOfMemory},
+    {"amid floods", CostAmidFloods},
+    {"slowest amid floods", SlowestAmidFloods},
 };
 
 } // namespace

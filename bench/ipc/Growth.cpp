@@ -8,7 +8,9 @@
 #include "platform/linux/PortPacket.h"
 #include "platform/linux/ProcProcessTable.h"
 
+#include <algorithm>
 #include <cstring>
+#include <string_view>
 #include <sys/socket.h>
 
 namespace {
@@ -77,22 +79,52 @@ double CostBetween(std::size_t size, bool inMemory) {
     return times.size() < 220 ? 0 : Median(times);
 }
 
+const Rival& Ours() {
+    return *std::ranges::find(Rivals(), std::string_view("ours"), &Rival::name);
+}
+
+Payload DataOf(std::size_t bytes) {
+    const auto data = std::make_shared<std::vector<std::byte>>(bytes);
+    return {plist::Dictionary{{"data", plist::Data(*data, data)}}, {}};
+}
+
+Times TimesAmidFloods(const std::string& place, std::size_t floods) {
+    Pair pair(Ours(), place);
+    for (std::size_t i = 0; i < floods; ++i)
+        StartProcess([&] {
+            const auto sender = Ours().make(place);
+            const auto payload = DataOf(i % 2 == 0 ? 10 : 1'000'000);
+            for (;;)
+                sender->send(payload, false);
+        });
+    Times times;
+    for (int i = 0; i < 5'000; ++i) {
+        if (i == 1'000) times.clear(); // the floods rise
+        times.push_back(TimeOf([&] { pair.sender().send(MenuRefresh(55), true); }));
+        Rest(300);
+    }
+    return times;
+}
+
 } // namespace
 
 double CostOfSize(const std::string& place, std::size_t bytes) {
-    for (const auto& rival : Rivals()) {
-        if (rival.name != std::string("ours")) continue;
-        Pair pair(rival, place);
-        auto data = std::make_shared<std::vector<std::byte>>(bytes);
-        const Payload payload{plist::Dictionary{{"data", plist::Data(*data, data)}}, {}};
-        Times times;
-        for (int i = 0; i < (bytes > 1'000'000 ? 20 : 200); ++i) {
-            times.push_back(pair.timeToHandle(payload));
-            Rest(100 + static_cast<int>(bytes / 10'000));
-        }
-        return Median(times);
+    Pair pair(Ours(), place);
+    const auto payload = DataOf(bytes);
+    Times times;
+    for (int i = 0; i < (bytes > 1'000'000 ? 20 : 200); ++i) {
+        times.push_back(pair.timeToHandle(payload));
+        Rest(100 + static_cast<int>(bytes / 10'000));
     }
-    return 0;
+    return Median(times);
+}
+
+double CostAmidFloods(const std::string& place, std::size_t floods) {
+    return Median(TimesAmidFloods(place, floods));
+}
+
+double SlowestAmidFloods(const std::string& place, std::size_t floods) {
+    return Quantile(TimesAmidFloods(place, floods), 1);
 }
 
 double CostOfClients(const std::string& place, std::size_t clients) {

@@ -39,7 +39,11 @@ public:
             }
         }
     }
-    void connect() override { m_socket = UnixSocket(SOCK_SEQPACKET, m_path, false); }
+    void connect() override {
+        m_socket = UnixSocket(SOCK_SEQPACKET, m_path, false);
+        const int room = 2 * static_cast<int>(inlineLimit);
+        setsockopt(m_socket, SOL_SOCKET, SO_SNDBUF, &room, sizeof room);
+    }
     void send(const Payload& payload, bool wait) override {
         Header header{payload.bytes.size(), wait};
         iovec vectors[2] = {{&header, sizeof header},

@@ -49,6 +49,9 @@ SMSearchField::SMSearchField(QWidget* parent)
     : QLineEdit(parent) {
     setFrame(false);
     setTextMargins(textMargin, 0, textMargin, 0);
+    // Where the panel's own text begins, whichever way the keyboard writes.
+    setAlignment(QStyle::visualAlignment(layoutDirection(), Qt::AlignLeft) | Qt::AlignAbsolute |
+                 Qt::AlignVCenter);
     QFont textFont = font();
     textFont.setPixelSize(fontSize);
     setFont(textFont);

@@ -191,10 +191,7 @@ SMMenuButton::Pointer SMMenuCollectionView::findButtonForMenuItem(const SMMenuIt
 SMMenuButton::Pointer SMMenuCollectionView::buttonAt(KXPoint point) const {
     SMMenuButton::Pointer hit;
     forEachVisibleButton([&](SMMenuButton& button) {
-        const KXRect& f = button.frame();
-        const bool inside =
-            point.x >= f.minX() && point.x < f.maxX() && point.y >= f.minY() && point.y < f.maxY();
-        if (inside) hit = button.shared_from_this();
+        if (button.frame().contains(point)) hit = button.shared_from_this();
     });
     return hit;
 }

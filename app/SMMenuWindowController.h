@@ -83,6 +83,7 @@ private:
     // Search and keyboard.
     std::string searchText() const;
     void tellResultCount();
+    const MenuSearchIndex& searchIndex();
     SMMenuItems filterAppListWithSearchText(const std::string& text);
     KeyViewRing keyViewRing() const;
     bool moveMouseOver(SMEditingCommand command);
@@ -120,4 +121,5 @@ private:
     std::optional<platform::Clock::Instant> m_hideMenuWindowDate;
     bool m_isOptionKeyPressed = false;
     MenuSearchIndex m_searchIndex;
+    std::unique_ptr<platform::Handle> m_indexing; ///< null while none is due
 };

@@ -64,10 +64,15 @@ std::string SMMenuWindowController::searchText() const {
     return QString::fromStdString(m_outlets->searchString()).trimmed().toStdString();
 }
 
-SMMenuItems SMMenuWindowController::filterAppListWithSearchText(const std::string& text) {
+const MenuSearchIndex& SMMenuWindowController::searchIndex() {
+    m_indexing.reset();
     const auto& apps = m_owner.model().searchableApps;
     if (m_searchIndex.items() != apps) m_searchIndex = MenuSearchIndex(apps);
-    return m_searchIndex.itemsContaining(text);
+    return m_searchIndex;
+}
+
+SMMenuItems SMMenuWindowController::filterAppListWithSearchText(const std::string& text) {
+    return searchIndex().itemsContaining(text);
 }
 
 void SMMenuWindowController::controlTextDidChange() {

@@ -16,10 +16,6 @@ namespace {
 
 constexpr std::chrono::seconds wheelHoldsHoverScrollingBack{1};
 
-bool contains(const KXRect& rect, KXPoint point) {
-    return point.x >= rect.minX() && point.x < rect.maxX() && point.y >= rect.minY() && point.y < rect.maxY();
-}
-
 } // namespace
 
 KXRect SMMenuWindowController::frameInWindow(const SMMenuButton& button) const {
@@ -33,14 +29,14 @@ KXRect SMMenuWindowController::frameInWindow(const SMMenuButton& button) const {
 
 SMMenuButton::Pointer SMMenuWindowController::buttonAt(KXPoint point) const {
     for (const auto& button : {m_settingsButton, m_actionButton})
-        if (contains(frameInWindow(*button), point)) return button;
+        if (frameInWindow(*button).contains(point)) return button;
     const std::pair<SMMenuArea, const SMMenuCollectionView*> lists[] = {
         {SMMenuArea::leftMenu, &m_leftMenuCollectionView},
         {SMMenuArea::rightMenuBox, m_rightMenuCollectionView.get()},
     };
     for (const auto& [area, list] : lists) {
         const KXRect frame = m_outlets->areaFrame(area);
-        if (contains(frame, point)) return list->buttonAt({point.x - frame.x, point.y - frame.y});
+        if (frame.contains(point)) return list->buttonAt({point.x - frame.x, point.y - frame.y});
     }
     return nullptr;
 }

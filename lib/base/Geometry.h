@@ -25,5 +25,7 @@ struct KXRect {
     float maxY() const { return y + height; }
     KXPoint origin() const { return {x, y}; }
     KXSize size() const { return {width, height}; }
+    /// Not on the edges that have the greater coordinates.
+    bool contains(KXPoint p) const { return p.x >= minX() && p.x < maxX() && p.y >= minY() && p.y < maxY(); }
     friend bool operator==(const KXRect&, const KXRect&) = default;
 };

@@ -108,8 +108,8 @@ MenuRowContent SMMenuButton::content(const SMMenuItem* item, KXSize size) const 
 }
 
 void SMMenuButton::draw(QPainter& painter, KXSize size, MenuPainter& tools) const {
-    const SMMenuItem* item = curMenuItem().get();
-    if (isSeparator(item)) {
+    const auto item = curMenuItem();
+    if (isSeparator(item.get())) {
         if (m_style != SMMenuButtonStyleList && m_style != SMMenuButtonStyleHome) return;
         const float y = std::round(size.height * 0.5F) - 1;
         tools.fillWhite(painter, {0, y, size.width, 1}, 0.7F, 0.5F);
@@ -118,9 +118,9 @@ void SMMenuButton::draw(QPainter& painter, KXSize size, MenuPainter& tools) cons
     }
     if (item && item->isFlexibleSpace()) return;
 
-    const bool highlighted = m_enabled && (m_highlighted || m_hasMouseOver);
+    const bool highlighted = isDrawnHighlighted();
     if (highlighted) {
-        tools.fillHighlight(painter, {0, 0, size.width, size.height});
+        tools.fillGradient(painter, {0, 0, size.width, size.height}, MenuGradientUse::rowHighlight);
         tools.fillWhite(painter, {0, 0, size.width, 1}, 0, 0.1F);
         tools.fillWhite(painter, {0, size.height - 1, size.width, 1}, 0, 0.15F);
     }
@@ -129,17 +129,17 @@ void SMMenuButton::draw(QPainter& painter, KXSize size, MenuPainter& tools) cons
                         menuArrowWhite(m_style, highlighted));
         return;
     }
-    drawContent(painter, size, tools, highlighted);
+    drawContent(painter, size, tools, item.get());
 }
 
-void SMMenuButton::drawContent(QPainter& painter, KXSize size, MenuPainter& tools, bool highlighted) const {
-    const auto item = curMenuItem();
+void SMMenuButton::drawContent(QPainter& painter, KXSize size, MenuPainter& tools, SMMenuItem* item) const {
+    const bool highlighted = isDrawnHighlighted();
     const std::string& title = item ? item->title() : m_title;
     const float white = menuTitleWhite(m_style, m_enabled, highlighted);
-    const char* mark = markOf(item.get());
+    const char* mark = markOf(item);
     const auto icon = item && m_style != SMMenuButtonStyleLeftPane ? item->icon() : nullptr;
 
-    MenuRowContent parts = content(item.get(), size);
+    MenuRowContent parts = content(item, size);
     parts.titleSize = tools.textSize(title);
     if (mark) parts.markSize = tools.textSize(mark);
     if (icon) parts.iconAspect = KXSizeAspectRatio(icon->size());

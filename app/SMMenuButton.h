@@ -81,7 +81,8 @@ public:
 
 private:
     MenuRowContent content(const SMMenuItem* item, KXSize size) const;
-    void drawContent(QPainter& painter, KXSize size, MenuPainter& tools, bool highlighted) const;
+    bool isDrawnHighlighted() const { return m_enabled && (m_highlighted || m_hasMouseOver); }
+    void drawContent(QPainter& painter, KXSize size, MenuPainter& tools, SMMenuItem* item) const;
 
     const platform::ModifierKeys* m_keys;
     SMMenuItem::Pointer m_menuItem;

@@ -2,7 +2,6 @@
 
 #include "lib/base/Geometry.h"
 
-#include <QRect>
 #include <QWidget>
 
 class MenuPainter;
@@ -18,9 +17,8 @@ public:
 
 protected:
     /// The one place where rectangles that count y upwards become this widget's.
-    QRectF fromUpwards(const KXRect& rect) const {
-        return {rect.x, static_cast<double>(height()) - static_cast<double>(rect.maxY()), rect.width,
-                rect.height};
+    KXRect fromUpwards(const KXRect& rect) const {
+        return {rect.x, static_cast<float>(height()) - rect.maxY(), rect.width, rect.height};
     }
 
 private:

@@ -81,7 +81,7 @@ void SMMenuListWidget::paintEvent(QPaintEvent* event) {
 void SMMenuListWidget::drawRows(QPainter& painter, const QRectF& dirty) {
     if (!m_list) return;
     m_list->forEachVisibleButton([&](const SMMenuButton& button) {
-        const QRectF place = fromUpwards(button.frame());
+        const QRectF place = placeOf(button);
         if (!place.intersects(dirty)) return;
         painter.translate(place.topLeft()); // and back: saving the painter's state would allocate
         ++m_paintedRows;

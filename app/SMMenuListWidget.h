@@ -2,6 +2,7 @@
 
 #include "app/SMMenuCollectionView.h"
 #include "app/SMMenuHostWidget.h"
+#include "lib/kxAppKit/KXQtGeometry.h"
 
 #include <QPixmap>
 #include <cstddef>
@@ -19,7 +20,7 @@ public:
     void fitList();
     SMMenuCollectionView* list() const { return m_list; }
     /// In the widget.
-    QRectF placeOf(const SMMenuButton& row) const { return fromUpwards(row.frame()); }
+    QRectF placeOf(const SMMenuButton& row) const { return KXQtRect(fromUpwards(row.frame())); }
     /// Rows painted since the beginning, for those who count.
     std::size_t paintedRows() const { return m_paintedRows; }
     /// Slides from the list shown to another, which comes in from where text ends when `forward`. Returns
@@ -30,7 +31,7 @@ protected:
     void paintEvent(QPaintEvent* event) override;
 
 private:
-    void setNeedsDisplay(const KXRect& area) override { update(fromUpwards(area).toAlignedRect()); }
+    void setNeedsDisplay(const KXRect& area) override { update(KXQtRect(fromUpwards(area)).toAlignedRect()); }
 
     struct Slide {
         QPixmap before;

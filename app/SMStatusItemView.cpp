@@ -1,12 +1,13 @@
 #include "app/SMStatusItemView.h"
 #include "lib/base/Geometry.h"
+#include "lib/kxAppKit/KXGeometry.h"
+#include "lib/kxAppKit/KXQtGeometry.h"
 
 #include <QCoreApplication>
 #include <QGuiApplication>
 #include <QPainter>
 #include <QPalette>
 #include <QSvgRenderer>
-#include <cmath>
 #include <string>
 
 namespace {
@@ -31,19 +32,13 @@ void SMStatusItemView::setIsSelected(bool isSelected) {
     if (m_statusItem) m_statusItem->setNeedsDisplay();
 }
 
-KXRect SMStatusItemView::iconRect(KXSize bounds, KXSize icon) {
-    return {std::round((bounds.width - icon.width) * 0.5f), std::round((bounds.height - icon.height) * 0.5f),
-            icon.width, icon.height};
-}
-
 void SMStatusItemView::draw(QPainter& painter, KXSize bounds) {
     if (m_isSelected)
         painter.fillRect(QRectF(0, 0, bounds.width, bounds.height), QGuiApplication::palette().highlight());
     QSvgRenderer icon(m_isSelected ? QStringLiteral(":/statusIconSelected") : QStringLiteral(":/statusIcon"));
     const QSizeF size = icon.defaultSize();
-    const KXRect rect =
-        iconRect(bounds, {static_cast<float>(size.width()), static_cast<float>(size.height())});
-    icon.render(&painter, QRectF(rect.x, rect.y, rect.width, rect.height));
+    const KXSize iconSize{static_cast<float>(size.width()), static_cast<float>(size.height())};
+    icon.render(&painter, KXQtRect(KXRectCenteringSize({0, 0, bounds.width, bounds.height}, iconSize)));
 }
 
 std::string SMStatusItemView::toolTip() const {

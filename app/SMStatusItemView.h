@@ -22,9 +22,6 @@ public:
     KXRect windowRect() const { return m_windowRect; } ///< kept for its owner, of no use to the view
     void setWindowRect(KXRect rect) { m_windowRect = rect; }
 
-    /// Where an icon of that size is drawn: in the middle, on whole points, never scaled.
-    static KXRect iconRect(KXSize bounds, KXSize icon);
-
     KXSize frameSize() const override { return m_frameSize; }
     void draw(QPainter& painter, KXSize bounds) override;
     void mouseDown() override { sendAction(); }

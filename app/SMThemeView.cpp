@@ -91,9 +91,7 @@ void SMThemeView::drawChrome(QPainter& painter) const {
 }
 
 void SMThemeView::drawRightPane(QPainter& painter) const {
-    const QRectF pane = fromUpwards(m_panes.right);
-    const KXRect right{static_cast<float>(pane.x()), static_cast<float>(pane.y()), m_panes.right.width,
-                       m_panes.right.height};
+    const KXRect right = fromUpwards(m_panes.right);
     const auto rounded = [&](float grow) {
         return KXBezierPath::bezierPathWithRoundRect(KXInsetRect(right, -grow, -grow), paneRadius);
     };
@@ -103,9 +101,7 @@ void SMThemeView::drawRightPane(QPainter& painter) const {
 }
 
 void SMThemeView::drawTopPane(QPainter& painter) const {
-    const QRectF pane = fromUpwards(m_panes.top).adjusted(1, 0, -1, 0);
-    const KXRect top{static_cast<float>(pane.x()), static_cast<float>(pane.y()),
-                     static_cast<float>(pane.width()), static_cast<float>(pane.height())};
+    const KXRect top = KXInsetRect(fromUpwards(m_panes.top), 1, 0);
     painter.setRenderHint(QPainter::Antialiasing, false);
     tools().fillGradient(painter, top, MenuGradientUse::topPane);
     tools().fillWhite(painter, {top.x, top.maxY() - 1, top.width, 1}, 0, 0.5F);

@@ -4,6 +4,7 @@
 #include "app/menuPicture.h"
 #include "lib/base/Geometry.h"
 #include "lib/kxAppKit/KXBezierPath.h"
+#include "lib/kxAppKit/KXQtGeometry.h"
 
 #include <QFontMetricsF>
 #include <QPainter>
@@ -54,8 +55,7 @@ void SMTitlePopUpButton::drawTitle(QPainter& painter) const {
 
     painter.setFont(titleFont);
     painter.setPen(Qt::white);
-    painter.drawText(QRectF(titleRect.x, titleRect.y, titleRect.width, titleRect.height),
-                     Qt::AlignLeft | Qt::TextSingleLine,
+    painter.drawText(KXQtRect(titleRect), Qt::AlignLeft | Qt::TextSingleLine,
                      metrics.elidedText(m_drawnTitle, Qt::ElideMiddle, titleWidth));
     painter.setRenderHint(QPainter::Antialiasing);
     // "Up" is not the wrong way round: y grows downwards here, so the arrow points down.

@@ -23,6 +23,13 @@ constexpr int fontSize = 12;
 constexpr int graphiteVariant = 6;
 constexpr std::size_t keptTexts = 4096;
 
+/// From top to bottom.
+struct MenuGradient {
+    std::uint8_t start[3];
+    std::uint8_t end[3];
+    float alpha;
+};
+/// By use, then for blue and graphite.
 constexpr MenuGradient gradients[2][2] = {
     {{{81, 112, 246}, {26, 67, 243}, 1}, {{106, 114, 122}, {85, 94, 105}, 1}},
     {{{72, 105, 246}, {30, 70, 243}, 0.95F}, {{107, 115, 123}, {88, 98, 108}, 0.95F}},
@@ -74,19 +81,17 @@ void drawPixels(QPainter& painter, const QImage& picture, QPointF corner, double
     painter.drawImage(QRectF(snapped, QSizeF(picture.size()) / ratio), picture);
 }
 
-} // namespace
-
-const MenuGradient& menuGradient(MenuGradientUse use, int colorVariant) {
-    return gradients[use == MenuGradientUse::topPane][colorVariant == graphiteVariant];
-}
-
-QRectF MenuHairline(const QPainter& painter, const QRectF& rect) {
+/// The line of a rectangle's top edge that is as thick as the rectangle, in whole device pixels, at least
+/// one.
+QRectF hairline(const QPainter& painter, const QRectF& rect) {
     const QTransform toDevice = painter.deviceTransform();
     const QRectF device = toDevice.mapRect(rect);
     const double thickness = std::max(1.0, std::floor(toDevice.m22() * rect.height() + 1e-4));
     return toDevice.inverted().mapRect(
         QRectF(device.left(), std::floor(device.top() + 0.5), device.width(), thickness));
 }
+
+} // namespace
 
 MenuPainter::MenuPainter(const platform::UserDefaults& defaults)
     : m_defaults(defaults)
@@ -112,6 +117,7 @@ MenuPainter::Text& MenuPainter::textFor(const std::string& text) {
     Text& entry = m_texts[text];
     entry.size = {static_cast<float>(std::ceil(line.naturalTextWidth())),
                   static_cast<float>(std::ceil(QFontMetricsF(m_font).height()))};
+    entry.glyphs.emplace(entry.size.width, layout.glyphRuns());
     return entry;
 }
 
@@ -133,19 +139,17 @@ void MenuPainter::drawText(QPainter& painter, const std::string& text, const KXR
     auto made = entry.glyphs.find(width);
     if (made == entry.glyphs.end()) {
         ++m_madeAnew;
-        QString line = singleLine(text);
-        if (width < entry.size.width) line = QFontMetricsF(m_font).elidedText(line, Qt::ElideRight, width);
-        QTextLayout layout(line, m_font);
+        QTextLayout layout(QFontMetricsF(m_font).elidedText(singleLine(text), Qt::ElideRight, width), m_font);
         layOut(layout);
         made = entry.glyphs.emplace(width, layout.glyphRuns()).first;
     }
     painter.setPen(pen(white));
     for (const QGlyphRun& glyphs : made->second)
-        painter.drawGlyphRun({rect.x, rect.y}, glyphs);
+        painter.drawGlyphRun(KXQtPoint(rect.origin()), glyphs);
 }
 
 void MenuPainter::fillWhite(QPainter& painter, const KXRect& rect, float white, float alpha) const {
-    const QRectF area = rect.height == 1 ? MenuHairline(painter, KXQtRect(rect)) : KXQtRect(rect);
+    const QRectF area = rect.height == 1 ? hairline(painter, KXQtRect(rect)) : KXQtRect(rect);
     painter.fillRect(area, grey(white, alpha));
 }
 
@@ -166,15 +170,12 @@ const QImage& MenuPainter::arrow(KXSize size, std::int32_t direction, float whit
 
 void MenuPainter::fillArrow(QPainter& painter, const KXRect& rect, std::int32_t direction, float white) {
     const double ratio = painter.device()->devicePixelRatioF();
-    drawPixels(painter, arrow(rect.size(), direction, white, ratio), QPointF(rect.x, rect.y), ratio);
-}
-
-void MenuPainter::fillHighlight(QPainter& painter, const KXRect& rect) const {
-    fillGradient(painter, rect, MenuGradientUse::rowHighlight);
+    drawPixels(painter, arrow(rect.size(), direction, white, ratio), KXQtPoint(rect.origin()), ratio);
 }
 
 void MenuPainter::fillGradient(QPainter& painter, const KXRect& rect, MenuGradientUse use) const {
-    const MenuGradient& colors = menuGradient(use, colorVariant());
+    const MenuGradient& colors =
+        gradients[use == MenuGradientUse::topPane][colorVariant() == graphiteVariant];
     // Line by line: a gradient of the toolkit's would be made anew, with its table, at every painting.
     const QTransform toDevice = painter.deviceTransform();
     const QTransform fromDevice = toDevice.inverted();
@@ -189,10 +190,10 @@ void MenuPainter::fillGradient(QPainter& painter, const KXRect& rect, MenuGradie
 
 void MenuPainter::drawIcon(QPainter& painter, const KXImage& image, const KXRect& rect) const {
     const double ratio = painter.device()->devicePixelRatioF();
-    const double extent = std::max(rect.width, rect.height);
-    const int side = qRound(extent * ratio);
-    const QImage picture = image.squareImage(side);
+    const float extent = std::max(rect.width, rect.height);
+    const QImage picture = image.squareImage(qRound(static_cast<double>(extent) * ratio));
     if (picture.isNull()) return;
-    const QPointF corner(rect.x - (extent - rect.width) / 2, rect.y - (extent - rect.height) / 2);
+    const QPointF corner =
+        KXQtPoint({rect.x - (extent - rect.width) / 2, rect.y - (extent - rect.height) / 2});
     drawPixels(painter, picture, corner, ratio);
 }

@@ -8,7 +8,6 @@
 #include <QImage>
 #include <QList>
 #include <QPen>
-#include <QRectF>
 #include <array>
 #include <cstddef>
 #include <cstdint>
@@ -22,20 +21,7 @@ namespace platform {
 class UserDefaults;
 }
 
-/// A gradient from top to bottom.
-struct MenuGradient {
-    std::uint8_t start[3];
-    std::uint8_t end[3];
-    float alpha;
-};
-
 enum class MenuGradientUse { rowHighlight, topPane };
-/// `colorVariant` is the appearance the user has set; 6 is graphite, everything else blue.
-const MenuGradient& menuGradient(MenuGradientUse use, int colorVariant);
-
-/// The line of a rectangle's top edge that is as thick as the rectangle, in whole device pixels, at least
-/// one.
-QRectF MenuHairline(const QPainter& painter, const QRectF& rect);
 
 /// What the menu's parts paint with; keeps what is costly to make: shaped text, in the widths it was drawn
 /// at. Rectangles count y downwards. Text is UTF-8. Main thread only.
@@ -48,7 +34,7 @@ public:
     /// most of a frame.
     static void prepareFonts(const std::string& text);
 
-    /// The appearance the user has set.
+    /// The appearance the user has set: 6 is graphite, everything else blue.
     int colorVariant() const;
 
     /// On one line, unshortened, in whole points.
@@ -58,7 +44,6 @@ public:
 
     void fillWhite(QPainter& painter, const KXRect& rect, float white, float alpha) const;
     void fillArrow(QPainter& painter, const KXRect& rect, std::int32_t direction, float white);
-    void fillHighlight(QPainter& painter, const KXRect& rect) const;
     void fillGradient(QPainter& painter, const KXRect& rect, MenuGradientUse use) const;
     void drawIcon(QPainter& painter, const KXImage& image, const KXRect& rect) const;
 

@@ -13,6 +13,7 @@
 
 namespace {
 
+constexpr float indentationWidth = 18;
 constexpr float arrowRoom = 26;
 constexpr float plainRightMargin = 11;
 constexpr float checkmarkRoom = 15;
@@ -63,7 +64,7 @@ const MenuRowMetrics& menuRowMetrics(std::int32_t style) {
 
 MenuRowGeometry menuRowGeometry(const MenuRowContent& content) {
     const MenuRowMetrics& metrics = menuRowMetrics(content.style);
-    const float inset = static_cast<float>(content.indentation) * menuIndentationWidth + metrics.inset;
+    const float inset = static_cast<float>(content.indentation) * indentationWidth + metrics.inset;
     const float height = content.size.height;
 
     // Room for a mark is taken from the left only: the right edge of the title stays where it is without one.

@@ -18,8 +18,6 @@ enum SMMenuButtonStyle : std::int32_t {
     SMMenuButtonStyleScrollDown = 6,
 };
 
-inline constexpr float menuIndentationWidth = 18;
-
 struct MenuRowMetrics {
     float iconSize;
     float gap;   ///< after the icon, and before a mark

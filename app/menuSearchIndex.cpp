@@ -60,8 +60,7 @@ bool isPlain(std::string_view text) {
     return std::ranges::all_of(text, [](char c) { return static_cast<unsigned char>(c - 1) < 0x7F; });
 }
 
-} // namespace
-
+/// A title as it is searched, in UTF-8 without NUL.
 std::string foldForSearch(std::string_view title) {
     if (isPlain(title)) {
         std::string folded(title);
@@ -89,6 +88,8 @@ std::string foldForSearch(std::string_view title) {
     }
     return folded.toStdString();
 }
+
+} // namespace
 
 MenuSearchIndex::MenuSearchIndex(SMMenuModel::List items)
     : m_items(std::move(items)) {

@@ -7,11 +7,8 @@
 #include <string_view>
 #include <vector>
 
-/// A title as it is searched: compatibility forms, case and accents folded away, in UTF-8 without NUL. Marks
-/// that readers do not take for accents (vowels of Indic scripts and Thai, voicing of kana) stay. Any thread.
-std::string foldForSearch(std::string_view title);
-
-/// The titles of a list, folded once and searched many times.
+/// The titles of a list, folded once and searched many times: compatibility forms, case and accents do not
+/// count. Marks that readers do not take for accents (vowels of Indic scripts and Thai, voicing of kana) do.
 class MenuSearchIndex {
 public:
     MenuSearchIndex() = default;

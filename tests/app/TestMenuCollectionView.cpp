@@ -59,40 +59,31 @@ TEST_F(MenuCollectionView, LaysOutOnceBeforeDrawingOrToBringAnItemIntoView) {
     EXPECT_EQ(layouts, 4) << "one each, however far it was";
 }
 
-TEST_F(MenuCollectionView, ScrollsWhileTheMouseRestsOnAnArrow) {
+TEST_F(MenuCollectionView, ScrollsWhileTheMouseRestsOnAnArrowButNotBeforeTheDateGiven) {
     show(*listTitled(numbered("", 30)));
+    const auto indexAfter = [this](int time) {
+        loop.advance(milliseconds(time));
+        return list.scrollIndex();
+    };
+    const auto holdBack = [this] {
+        list.setDelayedScrollTimerFireDate(loop.clock().now() + milliseconds(1000));
+    };
     const auto down = list.scrollDownMenuButton();
     down->setHasMouseOver(true);
-    loop.advance(milliseconds(49));
-    EXPECT_EQ(list.scrollIndex(), 0U);
-    loop.advance(milliseconds(101));
-    EXPECT_EQ(list.scrollIndex(), 4U) << "two, one, one";
-    down->setHasMouseOver(false);
-    loop.advance(milliseconds(500));
-    EXPECT_EQ(list.scrollIndex(), 4U);
-
-    list.scrollUpMenuButton()->setHasMouseOver(true);
-    loop.advance(milliseconds(500));
-    EXPECT_EQ(list.scrollIndex(), 0U);
-    EXPECT_FALSE(list.isScrollTimerValid()) << "ends where the list does";
-}
-
-TEST_F(MenuCollectionView, HoldsHoverScrollingBackUntilTheDateGiven) {
-    show(*listTitled(numbered("", 90)));
-    const auto inOneSecond = [&] { return loop.clock().now() + std::chrono::seconds(1); };
-    list.setDelayedScrollTimerFireDate(inOneSecond());
-    list.scrollDownMenuButton()->setHasMouseOver(true);
-    loop.advance(milliseconds(999));
-    EXPECT_EQ(list.scrollIndex(), 0U);
-    loop.advance(milliseconds(51));
-    EXPECT_EQ(list.scrollIndex(), 3U);
+    EXPECT_EQ(indexAfter(49), 0U);
+    EXPECT_EQ(indexAfter(101), 4U) << "two, one, one";
+    holdBack();
+    EXPECT_EQ(indexAfter(999), 4U) << "a timer that runs waits";
+    EXPECT_EQ(indexAfter(1), 5U);
     EXPECT_FALSE(list.delayedScrollTimerFireDate());
+    down->setHasMouseOver(false);
+    EXPECT_EQ(indexAfter(500), 5U);
 
-    list.setDelayedScrollTimerFireDate(inOneSecond()); // a running timer waits too
-    loop.advance(milliseconds(999));
-    EXPECT_EQ(list.scrollIndex(), 3U);
-    loop.advance(milliseconds(1));
-    EXPECT_EQ(list.scrollIndex(), 4U);
+    holdBack();
+    list.scrollUpMenuButton()->setHasMouseOver(true);
+    EXPECT_EQ(indexAfter(999), 5U) << "and so does one that starts";
+    EXPECT_EQ(indexAfter(501), 0U);
+    EXPECT_FALSE(list.isScrollTimerValid()) << "ends where the list does";
 }
 
 TEST_F(MenuCollectionView, LeavesRowsThatOutliveItHarmless) {

@@ -138,14 +138,17 @@ TEST_F(MenuPanel, PaintsOnlyRowsInViewAndMakesNothingAnewForTheSamePicture) {
     EXPECT_EQ(box->tools().madeAnew(), made);
 }
 
-TEST_F(MenuPanel, TellsOfAMachineOnlyWhenTheUserChoosesIt) {
+TEST_F(MenuPanel, TellsOfAMachineAndGoesHomeOnlyWhenTheUserChoosesIt) {
     auto* machines = widget<QComboBox>("vmListPopUpButton");
     owner.contents.selectedIndex = 7;
     window->reloadData();
     EXPECT_EQ(machines->currentIndex(), 0) << "out of range changes nothing";
-    EXPECT_TRUE(owner.log.empty());
+    controller().actionButton()->sendAction();
     machines->setCurrentIndex(2);
+    EXPECT_EQ(controller().searchState(), SMMenuStateFolder);
+    EXPECT_TRUE(owner.log.empty());
     Q_EMIT machines->activated(2);
+    EXPECT_EQ(controller().searchState(), SMMenuStateHome) << "before the main application answers";
     EXPECT_EQ(owner.log, Titles{"select 2"});
 }
 

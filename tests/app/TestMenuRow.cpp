@@ -9,14 +9,8 @@
 namespace {
 
 TEST(MenuRow, IsMirroredPartByPart) {
-    for (std::int32_t style = SMMenuButtonStyleLeftPane; style <= SMMenuButtonStyleAllPrograms; ++style) {
-        MenuRowContent content;
-        content.style = style;
-        content.size = {290, 20};
-        content.titleSize = {60, 15};
-        content.hasArrow = content.parentHasCheckmark = true;
-        content.markSize = KXSize{8, 15};
-        content.iconAspect = 2.0F;
+    for (const auto style : {SMMenuButtonStyleList, SMMenuButtonStyleBack, SMMenuButtonStyleAllPrograms}) {
+        MenuRowContent content{style, 0, {290, 20}, true, true, false, {60, 15}, KXSize{8, 15}, 2.0F};
         const auto plain = menuRowGeometry(content);
         content.isMirrored = true;
         const auto mirrored = menuRowGeometry(content);

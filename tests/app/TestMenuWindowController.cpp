@@ -72,14 +72,6 @@ TEST_F(MenuWindowController, UnfoldsFoldersOfAllProgramsInPlace) {
     EXPECT_EQ(rightTitles(), home);
 }
 
-TEST_F(MenuWindowController, GoesHomeAtOnceWhenAMachineIsChosen) {
-    clickAction();
-    outlets->selectedMachine = 0;
-    outlets->events->onVMListPopUpButton();
-    EXPECT_EQ(rightTitles(), home);
-    EXPECT_EQ(owner.log, Titles{"select 0"});
-}
-
 TEST_F(MenuWindowController, KeepsASearchForThirtySecondsAndAFolderNotAtAll) {
     const auto reopenAfter = [&](milliseconds time) {
         menu->hideMenuWindow();

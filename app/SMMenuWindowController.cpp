@@ -111,6 +111,7 @@ void SMMenuWindowController::updateContents() {
     m_leftMenuCollectionView.setStyle(SMMenuButtonStyleLeftPane);
     m_leftMenuCollectionView.setDisallowScrolling(true);
     m_leftMenuCollectionView.setMenuItems(std::move(items));
+    if (m_searchIndex.items() == m_owner.model().searchableApps) return;
     // After this turn, but not as late as the first key: folding thousands of titles takes half a frame.
     using Milliseconds = platform::MainLoop::Milliseconds;
     m_indexing = m_services.mainLoop.startTimer(Milliseconds{0}, Milliseconds{0}, [this] { searchIndex(); });

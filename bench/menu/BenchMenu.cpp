@@ -320,6 +320,7 @@ private:
         m_window->hideMenuWindow();
         roundTrip();
         QCoreApplication::processEvents();
+        QCoreApplication::sendPostedEvents(nullptr, QEvent::DeferredDelete); // as a loop that runs does
     }
     void press(int key, const QString& text) {
         untilPainted([&] {

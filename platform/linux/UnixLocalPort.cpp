@@ -115,8 +115,8 @@ void UnixLocalPort::accept() {
 void UnixLocalPort::refuseOne() {
     m_spare.reset();
     Descriptor(accept4(m_name->listener(), nullptr, nullptr, SOCK_CLOEXEC));
+    complain(0, "no descriptor left"); // before the last one is taken again: the log needs it
     m_spare.reset(::open("/dev/null", O_RDONLY | O_CLOEXEC));
-    complain(0, "no descriptor left");
 }
 
 /// What is there now, and little enough for the others to have their turn soon.

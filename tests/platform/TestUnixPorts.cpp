@@ -5,6 +5,7 @@
 
 #include <future>
 #include <gmock/gmock.h>
+#include <sys/resource.h>
 #include <sys/stat.h>
 
 // What only the system's ports do: directories, other processes, queues, and peers that do not play by the
@@ -184,6 +185,27 @@ TEST_F(UnixPorts, cutOffPeersThatSendWhatIsNoPacket) {
     EXPECT_LE(OpenDescriptors(), descriptors + 5) << "peers' ends, one of them already closed";
     listener.close();
     EXPECT_TRUE(silent.isCutOff());
+}
+
+TEST_F(UnixPorts, cutOffWhomTheyHaveNoDescriptorFor) {
+    Listener listener(loop, server, name);
+    rlimit before = {};
+    getrlimit(RLIMIT_NOFILE, &before);
+    const rlimit low{std::min<rlim_t>(before.rlim_cur, 256), before.rlim_max};
+    setrlimit(RLIMIT_NOFILE, &low);
+    std::vector<Descriptor> all;
+    do
+        all.emplace_back(dup(STDERR_FILENO));
+    while (all.back());
+    all.pop_back();
+    all.pop_back(); // becomes the peer's own
+    RawPeer refused(directory, name);
+    EXPECT_TRUE(refused.isCutOff());
+    all.clear();
+    setrlimit(RLIMIT_NOFILE, &before);
+    EXPECT_EQ(Send(*client.connect(name), "later"), SendStatus::success);
+    EXPECT_TRUE(listener.waitFor(1));
+    EXPECT_EQ(ScratchHome::logged("no descriptor left"), 1);
 }
 
 TEST_F(UnixPorts, takePacketsFromTheProcessThatConnectedAlone) {

@@ -107,7 +107,7 @@ TEST_F(UnixPorts, neverBlockAnAsynchronousSenderAndKeepOrder) {
         const auto remote = client.connect(name);
         // Far more than a socket takes, and nobody reads.
         for (int i = 0; i < 2000; ++i)
-            ASSERT_EQ(Send(*remote, std::to_string(i) + std::string(i % 50 == 0 ? 200'000 : 2'000, ' ')),
+            ASSERT_EQ(Send(*remote, std::to_string(i) + std::string(i % 50 == 0 ? 300'000 : 2'000, ' ')),
                       SendStatus::success);
         EXPECT_EQ(remote->send({}, true, {10ms, 10ms}), SendStatus::sendTimeout);
         auto reading = std::async(std::launch::async, Read, std::ref(*port), 2001);

@@ -51,7 +51,7 @@ void ask(const std::string& directory, State& state) {
         if (isMine && server && server->isValid()) state.pair = pairOf(getpid(), server->pid());
     });
     client.setAllowIncomingMessages(true);
-    const plist::Value large = std::string(200'000, 'x');
+    const plist::Value large = std::string(300'000, 'x');
     int count = 0;
     const auto timer = program.loop.startTimer(Milliseconds(1), Milliseconds(1), [&] {
         state.connected = client.isConnected();
@@ -111,7 +111,7 @@ TEST_F(KillRounds, ThePairWorksAgainByItselfAndHoldsNoMoreThanBefore) {
     for (const auto& [victim, survivor] : {std::pair{theClient, &server}, {theServer, &client}}) {
         auto bound = holdings((*survivor)->pid());
         ++bound[1]; // the worker that sends what had to wait starts when it is needed first, and stays
-        bound[2] = 500'000; // two messages
+        bound[2] = 700'000; // two messages
         run(100, victim);
         TimeUntil(
             [&] { return std::ranges::equal(holdings((*survivor)->pid()), bound, std::less_equal<>()); });

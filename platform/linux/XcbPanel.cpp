@@ -45,10 +45,7 @@ private:
 
 bool XcbIsCompositing() {
     auto* c = XcbConnection();
-    if (!c) return false;
-    const auto cookie = xcb_get_selection_owner(c, XcbAtom(c, "_NET_WM_CM_S0"));
-    const XcbReply<xcb_get_selection_owner_reply_t> reply(xcb_get_selection_owner_reply(c, cookie, nullptr));
-    return reply && reply->owner != XCB_WINDOW_NONE;
+    return c && XcbSelectionOwner(c, "_NET_WM_CM_S0") != XCB_WINDOW_NONE;
 }
 
 bool XcbAnnouncesBlurBehind() {

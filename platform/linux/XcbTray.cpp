@@ -5,7 +5,6 @@
 #include "platform/linux/XcbConnection.h"
 
 #include <cstdint>
-#include <cstring>
 #include <optional>
 #include <xcb/xcb.h>
 #include <xcb/xproto.h>
@@ -25,15 +24,6 @@ void watchStructure(xcb_connection_t* c, xcb_window_t window) {
     xcb_change_window_attributes(c, window, XCB_CW_EVENT_MASK, &mask);
 }
 
-std::optional<std::uint32_t> firstValue(xcb_connection_t* c, xcb_window_t window, const char* property) {
-    const auto cookie = xcb_get_property(c, 0, window, XcbAtom(c, property), XCB_ATOM_ANY, 0, 1);
-    const XcbReply<xcb_get_property_reply_t> reply(xcb_get_property_reply(c, cookie, nullptr));
-    if (!reply || reply->format != 32 || reply->value_len < 1) return {};
-    std::uint32_t value = 0;
-    std::memcpy(&value, xcb_get_property_value(reply.get()), sizeof value);
-    return value;
-}
-
 int depthOfVisual(xcb_connection_t* c, xcb_visualid_t visual) {
     const auto* screen = xcb_setup_roots_iterator(xcb_get_setup(c)).data;
     for (auto depth = xcb_screen_allowed_depths_iterator(screen); depth.rem > 0; xcb_depth_next(&depth))
@@ -48,17 +38,15 @@ std::uint32_t XcbFindTray() {
     auto* c = XcbConnection();
     if (!c) return 0;
     watchStructure(c, XcbRootWindow(c));
-    const auto cookie = xcb_get_selection_owner(c, XcbAtom(c, traySelection));
-    const XcbReply<xcb_get_selection_owner_reply_t> reply(xcb_get_selection_owner_reply(c, cookie, nullptr));
-    if (!reply || reply->owner == XCB_WINDOW_NONE) return 0;
-    watchStructure(c, reply->owner);
-    return reply->owner;
+    const auto tray = XcbSelectionOwner(c, traySelection);
+    if (tray != XCB_WINDOW_NONE) watchStructure(c, tray);
+    return tray;
 }
 
 bool XcbTrayIsTranslucent(std::uint32_t tray) {
     auto* c = XcbConnection();
     if (!c) return false;
-    const auto visual = firstValue(c, tray, "_NET_SYSTEM_TRAY_VISUAL");
+    const auto visual = XcbNumber(c, tray, "_NET_SYSTEM_TRAY_VISUAL");
     return visual && depthOfVisual(c, *visual) == 32;
 }
 
@@ -66,15 +54,8 @@ void XcbDockInTray(std::uint32_t tray, std::uint32_t window) {
     auto* c = XcbConnection();
     if (!c) return;
     watchStructure(c, window);
-    xcb_client_message_event_t event{};
-    event.response_type = XCB_CLIENT_MESSAGE;
-    event.format = 32;
-    event.window = tray;
-    event.type = XcbAtom(c, "_NET_SYSTEM_TRAY_OPCODE");
-    event.data.data32[0] = XCB_CURRENT_TIME;
-    event.data.data32[1] = requestDock;
-    event.data.data32[2] = window;
-    xcb_send_event(c, 0, tray, XCB_EVENT_MASK_NO_EVENT, reinterpret_cast<const char*>(&event));
+    XcbSend(c, tray, XCB_EVENT_MASK_NO_EVENT, tray, "_NET_SYSTEM_TRAY_OPCODE",
+            {XCB_CURRENT_TIME, requestDock, window, 0, 0});
     xcb_flush(c);
 }
 
@@ -82,7 +63,7 @@ bool XcbIsHiddenByBridge(std::uint32_t window) {
     auto* c = XcbConnection();
     if (!c) return false;
     const XcbReply<xcb_query_tree_reply_t> tree(xcb_query_tree_reply(c, xcb_query_tree(c, window), nullptr));
-    return tree && firstValue(c, tree->parent, "_NET_WM_WINDOW_OPACITY") == 0U;
+    return tree && XcbNumber(c, tree->parent, "_NET_WM_WINDOW_OPACITY") == 0U;
 }
 
 KXRect XcbFrameOnDesktop(std::uint32_t window) {

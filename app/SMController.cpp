@@ -11,6 +11,7 @@
 #include "lib/ipc/KXIPCClient.h"
 #include "lib/kxAppKit/system/KXWorkspace.h"
 #include "lib/plist/Value.h"
+#include "platform/MainLoop.h"
 
 #include <any>
 #include <cstdint>

@@ -12,6 +12,7 @@
 #include "lib/base/Geometry.h"
 #include "lib/base/IsEqual.h"
 #include "lib/base/KXNotificationCenter.h"
+#include "platform/MainLoop.h"
 
 #include <QCoreApplication>
 #include <any>

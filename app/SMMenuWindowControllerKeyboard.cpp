@@ -6,6 +6,7 @@
 #include "app/SMMenuWindowController.h"
 #include "app/SMMenuWindowOutlets.h"
 #include "app/menuRow.h"
+#include "app/menuSearchIndex.h"
 #include "lib/base/Geometry.h"
 
 #include <QString>

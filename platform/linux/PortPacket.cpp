@@ -15,6 +15,7 @@
 #include <cstring>
 #include <memory>
 #include <optional>
+#include <span>
 #include <sys/socket.h>
 #include <sys/types.h>
 #include <sys/uio.h>

@@ -1,5 +1,6 @@
 #include "platform/linux/XcbServerTime.h"
 
+#include "platform/linux/XcbCalls.h"
 #include "platform/linux/XcbConnection.h"
 
 #include <cstddef>

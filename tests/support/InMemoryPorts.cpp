@@ -1,7 +1,5 @@
 #include "tests/support/InMemoryPorts.h"
 
-#include <ranges>
-
 using namespace platform;
 
 /// Where a synchronous sender finds how it went.
@@ -135,8 +133,10 @@ bool InMemoryPorts::isListening(const std::string& name) {
 
 std::vector<std::string> InMemoryPorts::listeningNames() {
     const std::lock_guard lock(m_network.mutex);
-    const auto names = std::views::keys(m_network.owners);
-    return {names.begin(), names.end()};
+    std::vector<std::string> names;
+    for (const auto& [name, owner] : m_network.owners)
+        names.push_back(name);
+    return names;
 }
 
 void InMemoryPorts::noticeHangUp(const std::string& name) {

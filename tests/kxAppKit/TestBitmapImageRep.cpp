@@ -183,7 +183,8 @@ TEST(Bitmap, DrawsIntoEveryLayout) {
             const auto target = bitmap(6, 6, format, before);
             ASSERT_TRUE(sources[round / 4]->drawIntoBitmapRep(*target, rect, Interpolation::high));
             for (int at = 0; at < 6 * 6 * 4; ++at) {
-                const int x = at / 4 % 6, y = at / 24, channel = at % 4;
+                const int x = at / 4 % 6, y = at / 24;
+                const auto channel = static_cast<std::size_t>(at % 4);
                 const bool inside = KXQtRect(rect).contains(QPointF(x + 0.5, 5.5 - y));
                 ASSERT_NEAR(target->bitmapData()[at], (inside ? red[format] : before)[channel],
                             inside ? 2 : 0)

@@ -61,7 +61,7 @@ void flood(const std::string& directory, State& state, const Kind& kind) {
     std::vector<std::byte> bytes(written.span().begin(), written.span().end());
     std::array<std::byte, sizeof first> number;
     plist::storeNumber(number.data(), first, sizeof first);
-    auto* const place = &*std::ranges::search(bytes, number).begin();
+    auto* const place = &*std::search(bytes.begin(), bytes.end(), number.begin(), number.end());
     const std::span<const std::byte> pieces[] = {bytes};
     const auto port = program.system.ports().connect(KX_IPC_ServerPortName());
     for (std::uint32_t i = 1; i <= kind.count; ++i) {

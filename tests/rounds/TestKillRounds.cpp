@@ -109,12 +109,12 @@ protected:
 
 TEST_F(KillRounds, ThePairWorksAgainByItselfAndHoldsNoMoreThanBefore) {
     for (const auto& [victim, survivor] : {std::pair{theClient, &server}, {theServer, &client}}) {
-        auto bound = holdings((*survivor)->pid());
+        const int pid = (*survivor)->pid();
+        auto bound = holdings(pid);
         ++bound[1]; // the worker that sends what had to wait starts when it is needed first, and stays
         bound[2] = 700'000; // two messages
         run(100, victim);
-        TimeUntil(
-            [&] { return std::ranges::equal(holdings((*survivor)->pid()), bound, std::less_equal<>()); });
+        TimeUntil([&] { return std::ranges::equal(holdings(pid), bound, std::less_equal<>()); });
     }
 
     run(99, either);

@@ -1,9 +1,11 @@
 #include "app/SMBorderlessWindow.h"
+
 #include "app/SMThemeView.h"
 #include "lib/base/Geometry.h"
 #include "platform/WindowServer.h"
 
 #include "app/menuBackground.h"
+
 #include <functional>
 #include <utility>
 

@@ -1,4 +1,5 @@
 #include "app/SMMenuButtonWidget.h"
+
 #include "app/SMMenuButton.h"
 #include "app/SMMenuHostWidget.h"
 

@@ -1,4 +1,5 @@
 #include "app/SMMenuListWidget.h"
+
 #include "app/SMMenuButton.h"
 #include "app/SMMenuCollectionView.h"
 #include "app/SMMenuHostWidget.h"

@@ -1,4 +1,5 @@
 #include "app/SMSearchField.h"
+
 #include "app/SMEditingCommand.h"
 
 #include "app/menuMirroring.h"

@@ -1,4 +1,5 @@
 #include "app/SMStatusItemView.h"
+
 #include "lib/base/Geometry.h"
 #include "lib/kxAppKit/KXGeometry.h"
 #include "lib/kxAppKit/KXQtGeometry.h"

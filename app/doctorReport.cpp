@@ -1,4 +1,5 @@
 #include "app/doctorReport.h"
+
 #include "platform/Findings.h"
 
 #include <cstddef>

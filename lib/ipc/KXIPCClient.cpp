@@ -10,6 +10,7 @@
 #include "lib/kxAppKit/system/KXProcess.h"
 #include "lib/plist/Value.h"
 #include "platform/MessagePort.h"
+
 #include <utility>
 
 KXIPCClient::KXIPCClient(KXIPCContext& context)

@@ -1,5 +1,7 @@
 #include "lib/ipc/KXIPCNames.h"
+
 #include "lib/kxAppKit/system/KXProcess.h"
+
 #include <string>
 
 std::string KX_IPC_ServerPortName() {

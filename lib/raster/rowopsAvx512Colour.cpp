@@ -1,6 +1,7 @@
 #include "lib/raster/avx512.h"
 #include "lib/raster/rasterops.h"
 #include "lib/raster/rowops.h"
+
 #include <cstddef>
 #include <cstdint>
 #include <cstring>

@@ -1,4 +1,5 @@
 #include "platform/linux/FollowingStatusBar.h"
+
 #include "lib/base/Geometry.h"
 #include "platform/MainLoop.h"
 #include "platform/StatusBar.h"

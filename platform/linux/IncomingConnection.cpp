@@ -1,6 +1,8 @@
 #include "platform/linux/IncomingConnection.h"
+
 #include "platform/MessagePort.h"
 #include "platform/linux/PortPacket.h"
+
 #include <cstdint>
 #include <memory>
 #include <mutex>

@@ -9,6 +9,7 @@
 #include "platform/linux/ProcProcessTable.h"
 #include "platform/linux/SystemClock.h"
 #include "platform/linux/TerminationSignals.h"
+
 #include <memory>
 
 namespace platform {

@@ -1,4 +1,5 @@
 #include "platform/linux/PanelPlacement.h"
+
 #include "lib/base/Geometry.h"
 
 #include <algorithm>

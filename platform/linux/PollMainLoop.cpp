@@ -1,4 +1,5 @@
 #include "platform/linux/PollMainLoop.h"
+
 #include "platform/Clock.h"
 #include "platform/MainLoop.h"
 

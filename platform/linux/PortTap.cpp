@@ -4,6 +4,7 @@
 #include "lib/plist/Value.h"
 #include "platform/linux/IncomingConnection.h"
 #include "platform/linux/PortPacket.h"
+
 #include <cstddef>
 #include <cstdint>
 #include <memory>

@@ -1,4 +1,5 @@
 #include "platform/linux/ProcProcessTable.h"
+
 #include "platform/Clock.h"
 #include "platform/MainLoop.h"
 #include "platform/ProcessTable.h"

@@ -1,4 +1,5 @@
 #include "platform/linux/SealedMemory.h"
+
 #include "lib/base/SharedBytes.h"
 #include "platform/linux/Descriptor.h"
 

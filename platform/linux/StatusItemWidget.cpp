@@ -1,4 +1,5 @@
 #include "platform/linux/StatusItemWidget.h"
+
 #include "platform/StatusBar.h"
 
 #include <QMouseEvent>

@@ -6,6 +6,7 @@
 #include "platform/linux/Destination.h"
 #include "platform/linux/SealedMemory.h"
 #include "platform/linux/UnixLocalPort.h"
+
 #include <memory>
 #include <string>
 #include <utility>

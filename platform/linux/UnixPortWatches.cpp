@@ -4,6 +4,7 @@
 #include "platform/PortWatch.h"
 #include "platform/linux/Descriptor.h"
 #include "platform/linux/PortPacket.h"
+
 #include <cstdint>
 #include <memory>
 #include <string>

@@ -1,4 +1,5 @@
 #include "platform/linux/XcbConnection.h"
+
 #include "platform/linux/XcbCalls.h"
 
 #include <QGuiApplication>

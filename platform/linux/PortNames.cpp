@@ -24,9 +24,6 @@ namespace platform {
 
 namespace {
 
-// Room for two packets of the inline size, where the system grants it.
-constexpr int sendBufferSize = 512 * 1024;
-
 Descriptor NewSocket() {
     return Descriptor(socket(AF_UNIX, SOCK_SEQPACKET | SOCK_CLOEXEC | SOCK_NONBLOCK, 0));
 }
@@ -62,6 +59,11 @@ Descriptor Listen(int directory, const std::string& name) {
 
 } // namespace
 
+void WidenSendBuffer(int socket) {
+    constexpr int size = 512 * 1024;
+    setsockopt(socket, SOL_SOCKET, SO_SNDBUF, &size, sizeof size);
+}
+
 OwnedName::OwnedName(std::shared_ptr<const Descriptor> directory, std::string name, Descriptor lock,
                      Descriptor listener)
     : m_directory(std::move(directory))
@@ -95,7 +97,7 @@ PortNames::Connecting PortNames::connect(const std::string& name, Descriptor& so
     if (!*m_directory || !IsPortName(name)) return Connecting::refused;
     socket = NewSocket();
     if (!socket) return Connecting::refused;
-    setsockopt(socket.get(), SOL_SOCKET, SO_SNDBUF, &sendBufferSize, sizeof sendBufferSize);
+    WidenSendBuffer(socket.get());
     if (BindOrConnect(::connect, socket, PathInDirectory(m_directory->get(), name)) == 0)
         return Connecting::done;
     return errno == EAGAIN ? Connecting::busy : Connecting::refused;

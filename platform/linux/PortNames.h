@@ -9,6 +9,9 @@
 
 namespace platform {
 
+/// Room in a socket for two packets of the inline size, where the system grants it.
+void WidenSendBuffer(int socket);
+
 /// A name that is ours, with the socket that listens under it. Its end gives the name up.
 class OwnedName {
 public:

@@ -3,6 +3,7 @@
 #include "lib/plist/Binary.h"
 #include "lib/plist/Value.h"
 #include "platform/linux/IncomingConnection.h"
+#include "platform/linux/PortNames.h"
 #include "platform/linux/PortPacket.h"
 
 #include <cstddef>
@@ -18,8 +19,13 @@
 namespace platform {
 
 void PortTap::add(const std::shared_ptr<IncomingConnection>& watcher, std::uint64_t sequence) {
+    // With a usual buffer it would miss, every time, the largest packets that go inline.
+    WidenSendBuffer(watcher->socket());
     const std::lock_guard lock(m_mutex);
-    std::erase_if(m_watchers, [](const Watcher& each) { return each.connection.expired(); });
+    std::erase_if(m_watchers, [&](const Watcher& each) {
+        const auto connection = each.connection.lock();
+        return !connection || connection == watcher; // who asks again gets no second copy of everything
+    });
     m_watchers.push_back({watcher});
     m_isWatched = true;
     const auto told = statistics();

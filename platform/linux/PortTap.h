@@ -25,7 +25,8 @@ public:
     };
     Counters counters;
 
-    /// Tells the watcher how the ports are doing, and from then on what passes, until the connection ends.
+    /// Tells the watcher how the ports are doing, and from then on what passes, counted from 0, until the
+    /// connection ends.
     void add(const std::shared_ptr<IncomingConnection>& watcher, std::uint64_t sequence);
 
     void didReceive(const PacketHeader& header, const SharedBytes& payload, int sender);

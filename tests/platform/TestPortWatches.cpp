@@ -2,7 +2,9 @@
 
 #include "lib/plist/Binary.h"
 #include "tests/platform/PortWorlds.h"
+#include "tests/platform/RawPeer.h"
 
+#include <array>
 #include <gmock/gmock.h>
 
 using namespace platform;
@@ -44,19 +46,19 @@ TEST_F(PortWatchesTest, TellOfWhatComesAndGoesUntilTheEnd) {
     EXPECT_EQ(watcher.statistics["received"].intValue(), 1);
     EXPECT_EQ(watcher.statistics["sent"].intValue(), 0);
 
-    const std::string large(300'000, 'x');
     Send(*toA, "question", true);
+    Send(*toA, std::string(250'000, 'x'), true);
     const auto toB = server.connect("b");
-    Send(*toB, large);
+    Send(*toB, std::string(300'000, 'x'));
     Send(*toB, "");
-    ASSERT_TRUE(loop.runUntil([&] { return watcher.messages.size() == 3 && a.arrivals().size() == 2; }));
+    ASSERT_TRUE(loop.runUntil([&] { return watcher.messages.size() == 4 && a.arrivals().size() == 3; }));
     std::string seen;
     for (const auto& message : watcher.messages) {
         EXPECT_EQ(message.processID, getpid());
         seen += (message.outgoing ? "out " : "in ") + std::to_string(message.bytes.size()) +
                 (message.synchronous ? " waits, " : ", ");
     }
-    EXPECT_EQ(seen, "in 8 waits, out 300000, out 0, ");
+    EXPECT_EQ(seen, "in 8 waits, in 250000 waits, out 300000, out 0, ");
     EXPECT_EQ(watcher.messages[0].bytes, SharedBytes::copyOf("question", 8));
     EXPECT_EQ(watcher.lost, 0U);
     a.close();
@@ -78,12 +80,25 @@ TEST_F(PortWatchesTest, NeverMakeTheWatchedWaitAndKnowWhatTheyMissed) {
     ASSERT_TRUE(loop.runUntil([&] { return watcher.lost > 0 && watcher.messages.back().bytes.size() == 5; }));
     EXPECT_EQ(watcher.messages.size() + watcher.lost, count + 2);
 
+    // Who asks again and again is told how it is each time, and gets one copy.
+    RawPeer eager(directory, "a");
+    std::array<char, 1000> packet;
+    for (int i = 0; i < 3; ++i)
+        eager.send({"a request", RawHeader({.flags = PacketHeader::tap})});
+    for (int i = 0; i < 3; ++i)
+        EXPECT_GT(eager.receive(packet.data(), packet.size()), 100);
+    for (const char sent : {'x', 'y'}) {
+        Send(*toA, {sent}, true);
+        EXPECT_EQ(eager.receive(packet.data(), packet.size()), 25);
+        EXPECT_EQ(packet[24], sent);
+    }
+
     watch.reset();
     Watcher second;
     Send(*toA, "x", true);
     watch = watches.watch("a", second);
     ASSERT_TRUE(loop.runUntil([&] { return second.statistics.size() > 0; }));
-    EXPECT_EQ(second.statistics["connections"].intValue(), 1) << "the first watcher's has gone";
+    EXPECT_EQ(second.statistics["connections"].intValue(), 1) << "without those of watchers";
 }
 
 } // namespace

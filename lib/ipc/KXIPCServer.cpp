@@ -42,6 +42,10 @@ KXIPCServer::KXIPCServer(KXIPCContext& context)
     KXIPCCommon::addEntries(KXIPCObserverEntryArray(rows, std::size(rows)), this);
 }
 
+KXIPCServer::~KXIPCServer() {
+    removeAllClients();
+}
+
 std::string KXIPCServer::portName() const {
     return KX_IPC_ServerPortName();
 }
@@ -69,7 +73,7 @@ std::vector<KXProcess::Pointer> KXIPCServer::clientsForMessage(const KXIPCMessag
 }
 
 void KXIPCServer::terminateWithDelegate(std::function<void()> selector) {
-    m_clients.clear();
+    removeAllClients();
     KXIPCCommon::terminateWithDelegate(std::move(selector));
 }
 
@@ -110,5 +114,12 @@ void KXIPCServer::onRemoveListener(const KXNotification& notification) {
 }
 
 void KXIPCServer::removeClient(std::uint64_t number) {
-    m_clients.erase(number);
+    const auto client = m_clients.extract(number);
+    // Others may keep the handle, which would call us after our end.
+    if (client) client.mapped().process->removeObserverForProcessDeath(this);
+}
+
+void KXIPCServer::removeAllClients() {
+    while (!m_clients.empty())
+        removeClient(m_clients.begin()->first);
 }

@@ -17,6 +17,9 @@
 class KXIPCServer : public KXIPCCommon {
 public:
     explicit KXIPCServer(KXIPCContext& context);
+    ~KXIPCServer() override;
+    KXIPCServer(const KXIPCServer&) = delete;
+    KXIPCServer& operator=(const KXIPCServer&) = delete;
 
     std::string portName() const override;
     /// Broadcasts on every call whether the server is there now; nothing when it lost the race for its name.
@@ -36,6 +39,7 @@ private:
     void onAddListener(const KXNotification& notification);
     void onRemoveListener(const KXNotification& notification);
     void removeClient(std::uint64_t number);
+    void removeAllClients();
     void confirm(const KXProcess& client);
 
     std::map<std::uint64_t, Client> m_clients; ///< by serial number

@@ -128,7 +128,10 @@ TEST_F(KXIPCClientServerTest, NobodyIsAddedWithoutANameOrTakenAwayByAnother) {
     other.sendRaw(KX_IPC_ServerPortName(), KXIPCEnvelope(message(removal, all), other.psn, 1, false));
     other.sendRaw(KX_IPC_ServerPortName(), KXIPCEnvelope(message("after"), other.psn, 2, false));
     ASSERT_TRUE(world.loop.runUntil([&] { return calls.back() == "after"; }));
-    EXPECT_EQ(clients(), 1U);
+    const auto kept = server->clientsForMessage(message("n"));
+    EXPECT_EQ(kept.size(), 1U);
+    server.reset();
+    EXPECT_EQ(serverPeer->processes.watchCount(), 0) << "nothing would be called that is gone";
 }
 
 TEST_F(KXIPCClientServerTest, AClientFollowsItsServersEndAndTheNextOne) {

@@ -1,5 +1,7 @@
 #include "lib/plist/JSON.h"
 
+#include "lib/plist/Unicode.h"
+
 #include <array>
 #include <cstdio>
 #include <string>
@@ -9,15 +11,16 @@ namespace plist {
 
 std::string QuotedJSON(std::string_view text) {
     std::string quoted = "\"";
-    for (const char character : text) {
+    while (!text.empty()) {
+        const char32_t character = unicode::takeUTF8(text);
         if (character == '"' || character == '\\') {
-            quoted += {'\\', character};
-        } else if (const auto code = static_cast<unsigned char>(character); code < 0x20) {
+            quoted += {'\\', static_cast<char>(character)};
+        } else if (character < 0x20 || (character >= 0x7F && character < 0xA0)) {
             std::array<char, 8> escape{};
-            std::snprintf(escape.data(), escape.size(), "\\u%04x", unsigned{code});
+            std::snprintf(escape.data(), escape.size(), "\\u%04x", static_cast<unsigned>(character));
             quoted += escape.data();
         } else {
-            quoted += character;
+            unicode::appendUTF8(quoted, character);
         }
     }
     return quoted + '"';

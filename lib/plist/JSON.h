@@ -5,7 +5,8 @@
 
 namespace plist {
 
-/// The text, which is UTF-8, as a string of JSON, with its quotes.
+/// UTF-8 as a string of JSON, with its quotes. Nothing in it controls a terminal; what is malformed becomes
+/// U+FFFD.
 std::string QuotedJSON(std::string_view text);
 
 } // namespace plist

@@ -33,7 +33,7 @@ TEST(KxipcLine, TellsAnyMessageOnOneLine) {
     std::string error;
     const plist::Value envelope = plist::Dictionary{
         {"message",
-         plist::Dictionary{{"name", "n\x1B\n\""},
+         plist::Dictionary{{"name", "n\x1B\n\"\xC2\x9B\xFF"},
                            {"userInfo", plist::Dictionary{{"a", plist::Array{-1, UINT64_MAX, 0.5, true, NAN}},
                                                           {"d", plist::Data::copyOf("abc", 3)}}}}},
         {"messageID", 7}};
@@ -41,7 +41,8 @@ TEST(KxipcLine, TellsAnyMessageOnOneLine) {
     EXPECT_EQ(KxipcLine(message, 1.5, true),
               "{\"seconds\":1.5,\"direction\":\"out\",\"process\":42,\"bytes\":" +
                   std::to_string(message.bytes.size()) +
-                  ",\"synchronous\":true,\"missed\":3,\"messageID\":7,\"name\":\"n\\u001b\\u000a\\\"\","
+                  ",\"synchronous\":true,\"missed\":3,\"messageID\":7,\"name\":"
+                  "\"n\\u001b\\u000a\\\"\\u009b\xEF\xBF\xBD\","
                   "\"userInfo\":{\"a\":[-1,18446744073709551615,0.5,true,null],\"d\":\"<3 bytes>\"}}\n");
     EXPECT_THAT(KxipcLine(message, 1.5, false),
                 testing::AllOf(testing::StartsWith("(3 messages missed)\n"), testing::HasSubstr("1.500 out"),

@@ -28,7 +28,9 @@ constexpr std::uint64_t longestEntry = plist::Limits().bytes;
 
 void write(std::ostream& file, const plist::Value& entry) {
     std::string error;
+    // A message of the largest size is too large with what is noted of it: it is left out.
     const auto written = plist::WriteBinary(entry, error);
+    if (written.pieces.empty()) return;
     for (std::uint64_t length = written.size, i = 0; i < sizeof length; ++i)
         file.put(static_cast<char>(length >> (8 * i) & 0xFF));
     for (const auto piece : written.pieces)
@@ -111,8 +113,8 @@ void KxipcReplay::sendNext() {
     ++m_next;
     double pause = 0;
     if (m_speed > 0 && m_next < m_messages.size()) pause = (m_messages[m_next].seconds - seconds) / m_speed;
-    // A recording may claim any times; none is waited for longer than a day.
-    const auto milliseconds = static_cast<std::int64_t>(std::clamp(pause, 0.0, 86'400.0) * 1000);
+    // A recording may claim any times, what is no number too; none is waited for longer than a day.
+    const auto milliseconds = static_cast<std::int64_t>(pause > 0 ? std::min(pause, 86'400.0) * 1000 : 0);
     m_timer =
         m_context.mainLoop.startTimer(std::chrono::milliseconds(milliseconds), {}, [this] { sendNext(); });
 }

@@ -1,4 +1,6 @@
+#include "lib/ipc/KXIPCNames.h"
 #include "lib/plist/Binary.h"
+#include "tests/ipc/Peer.h"
 #include "tools/kxipcArguments.h"
 #include "tools/kxipcRecording.h"
 #include "tools/kxipcWatch.h"
@@ -68,6 +70,30 @@ TEST(KxipcRecording, ReadsWhatItWroteAndNothingElse) {
     EXPECT_EQ(KxipcReadRecording(cut, true)->size(), 1U);
     EXPECT_EQ(KxipcReadRecording(clients, false)->size(), 1U);
     EXPECT_FALSE(KxipcReadRecording(other, true));
+}
+
+TEST(KxipcReplay, SendsAsItselfAtTheTimesOfTheRecording) {
+    World world;
+    Peer peer(world, Peer::client), owner(world, Peer::server);
+    Collector told;
+    KXIPCMessageReceiver receiver(owner.context, told);
+    receiver.startReceivingWithPortName("p");
+    const KXIPCMessage message("n", {}, plist::Dictionary{{KX_IPC_PARAM_PSN, 7}});
+    const auto runUntilTold = [&](std::size_t count) {
+        return world.loop.runUntil([&] { return told.noted.size() >= count; });
+    };
+    bool isOver = false;
+    KxipcReplay replay(peer.context, {{1, message, false}, {4, message, false}, {NAN, message, false}}, "p",
+                       [&] { isOver = true; });
+    replay.start(2);
+    world.loop.advance(std::chrono::milliseconds(1499));
+    ASSERT_TRUE(runUntilTold(1));
+    EXPECT_EQ(peer.context.messageCounter, 1);
+    world.loop.advance(std::chrono::milliseconds(1));
+    ASSERT_TRUE(isOver && runUntilTold(3));
+    EXPECT_THAT(told.noted, testing::ElementsAre(1, 2, 3));
+    EXPECT_EQ(told.last["psnKey"], peer.number());
+    EXPECT_EQ(told.last["message"]["userInfo"][KX_IPC_PARAM_PSN], peer.number());
 }
 
 } // namespace

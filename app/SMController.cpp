@@ -96,12 +96,12 @@ void SMController::applicationWillTerminate() {
 }
 
 void SMController::onStatusItemClicked() {
+    const auto typing = m_services.holdTyping(); // however long this takes, no letter is lost
     if (!isMainAppRunning()) m_services.terminate();
     if (isMenuWindowVisible()) {
         closeMenuWindow();
         return;
     }
-    const auto typing = m_services.holdTyping(); // however long this takes, no letter is lost
     if (m_menuWindow)
         m_menuWindow->reloadData();
     else

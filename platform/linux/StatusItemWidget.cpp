@@ -1,6 +1,7 @@
 #include "platform/linux/StatusItemWidget.h"
 
 #include "platform/StatusBar.h"
+#include "platform/linux/XcbPanel.h"
 
 #include <QMouseEvent>
 #include <QPainter>
@@ -16,6 +17,12 @@ StatusItemWidget::StatusItemWidget(StatusItemView& view, Qt::WindowFlags flags)
     setAccessibleName(toolTip());
 }
 
+bool StatusItemWidget::event(QEvent* event) {
+    if (event->type() == QEvent::WinIdChange && internalWinId() != 0)
+        XcbHoldTypingFromPress(static_cast<std::uint32_t>(internalWinId()));
+    return QWidget::event(event);
+}
+
 void StatusItemWidget::paintEvent(QPaintEvent*) {
     QPainter painter(this);
     m_view.draw(painter, {static_cast<float>(width()), static_cast<float>(height())});
@@ -24,6 +31,7 @@ void StatusItemWidget::paintEvent(QPaintEvent*) {
 void StatusItemWidget::mousePressEvent(QMouseEvent* event) {
     if (event->button() == Qt::LeftButton) m_view.mouseDown();
     if (event->button() == Qt::RightButton) m_view.rightMouseDown();
+    XcbLetTypingGo(); // the panel has the keyboard, or whoever had it before
 }
 
 } // namespace platform

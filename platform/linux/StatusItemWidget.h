@@ -12,6 +12,7 @@ public:
     StatusItemWidget(StatusItemView& view, Qt::WindowFlags flags);
 
 protected:
+    bool event(QEvent* event) override;
     void paintEvent(QPaintEvent* event) override;
     void mousePressEvent(QMouseEvent* event) override;
     void mouseDoubleClickEvent(QMouseEvent* event) override { mousePressEvent(event); }

@@ -118,6 +118,27 @@ void XcbSetInputFocus(std::uint32_t window, std::uint32_t time) {
     const XcbReply<xcb_generic_error_t> error(xcb_request_check(c, cookie));
 }
 
+void XcbHoldTypingFromPress(std::uint32_t window) {
+    auto* c = XcbConnection();
+    if (!c) return;
+    constexpr std::uint16_t events =
+        XCB_EVENT_MASK_BUTTON_PRESS | XCB_EVENT_MASK_BUTTON_RELEASE | XCB_EVENT_MASK_BUTTON_MOTION;
+    for (const auto button : {XCB_BUTTON_INDEX_1, XCB_BUTTON_INDEX_3}) {
+        // Checked, though nothing can be done where another has grabbed them.
+        const auto cookie = xcb_grab_button_checked(c, 1, window, events, XCB_GRAB_MODE_ASYNC,
+                                                    XCB_GRAB_MODE_SYNC, XCB_WINDOW_NONE, XCB_CURSOR_NONE,
+                                                    static_cast<std::uint8_t>(button), XCB_MOD_MASK_ANY);
+        const XcbReply<xcb_generic_error_t> error(xcb_request_check(c, cookie));
+    }
+}
+
+void XcbLetTypingGo() {
+    auto* c = XcbConnection();
+    if (!c) return;
+    xcb_allow_events(c, XCB_ALLOW_ASYNC_KEYBOARD, XCB_CURRENT_TIME);
+    xcb_flush(c);
+}
+
 std::unique_ptr<Handle> XcbHoldTyping() {
     auto* c = XcbConnection();
     // Wayland's X server would hold nothing back of what is typed elsewhere.

@@ -31,6 +31,11 @@ bool XcbIsWithin(std::uint32_t window, std::uint32_t outer);
 /// Gives the window the keyboard, if it can be seen, and if nobody was given it after that time of the
 /// server's.
 void XcbSetInputFocus(std::uint32_t window, std::uint32_t time);
+/// From now on the server holds keys back from a press of the left or the right button on the window until
+/// that button is let go, or `XcbLetTypingGo`: also while this process has not yet seen the press. A process
+/// that hangs does so for no longer than the user's finger.
+void XcbHoldTypingFromPress(std::uint32_t window);
+void XcbLetTypingGo();
 /// Until the handle ends no key event reaches any program; then those that wait go to the window that has the
 /// keyboard. For moments only. Null where that cannot be had.
 std::unique_ptr<Handle> XcbHoldTyping();

@@ -119,6 +119,7 @@ private:
         m_view.activateWindow();
         m_keySince = XcbServerTime();
         XcbSetInputFocus(nativeWindow(), m_keySince);
+        XcbAnnounceServerTime(); // or a program started from the panel would not be given the keyboard
     }
 
     /// Whether a window is see-through is decided when it is made, so it is made anew where that changed.

@@ -9,6 +9,7 @@
 #include <string_view>
 #include <xcb/sync.h>
 #include <xcb/xcb.h>
+#include <xcb/xproto.h>
 
 namespace platform {
 
@@ -50,6 +51,15 @@ std::uint32_t XcbServerTime() {
     const XcbReply<xcb_sync_query_counter_reply_t> time(
         xcb_sync_query_counter_reply(c, xcb_sync_query_counter(c, clock), nullptr));
     return time ? time->counter_value.lo : std::uint32_t{XCB_CURRENT_TIME};
+}
+
+void XcbAnnounceServerTime() {
+    auto* c = XcbConnection();
+    if (!c) return;
+    // To a property that nobody reads; nothing is added to it.
+    xcb_change_property(c, XCB_PROP_MODE_APPEND, XcbRootWindow(c), XcbAtom(c, "_TESSEL_TIME"),
+                        XCB_ATOM_CARDINAL, 32, 0, nullptr);
+    xcb_flush(c);
 }
 
 } // namespace platform

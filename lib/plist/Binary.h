@@ -35,7 +35,8 @@ struct Encoded {
 };
 
 /// No pieces and why in `error` when the value cannot be written: a nil in it, or past the limits. Equal
-/// strings, numbers and data are written once. Invalid UTF-8 becomes U+FFFD.
+/// strings, numbers and data are written once, and so is an array or a dictionary that is shared. Invalid
+/// UTF-8 becomes U+FFFD.
 Encoded WriteBinary(const Value& value, std::string& error, const Limits& limits = {});
 
 /// Any format this library reads, told by its first bytes.

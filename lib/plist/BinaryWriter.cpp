@@ -11,6 +11,7 @@
 #include <cstddef>
 #include <cstdint>
 #include <cstring>
+#include <memory_resource>
 #include <span>
 #include <string>
 #include <string_view>
@@ -36,7 +37,6 @@ public:
         , m_nesting(std::min(limits.nesting, kDeepestNesting))
         , m_error(error) {
         // Room for a small message: growing there would take as long as writing.
-        m_out.reserve(512);
         m_objects.reserve(32);
         m_references.reserve(32);
         m_containers.reserve(8);
@@ -56,14 +56,15 @@ public:
 private:
     struct Object {
         std::size_t offset = 0; ///< in the file
-        std::size_t size = 0;   ///< of a leaf with its head, or of what stands elsewhere
         std::size_t mark = 0;   ///< of a leaf
-        const std::byte* elsewhere = nullptr;
     };
-    /// Where data that is pointed at stands, and the object that holds it or its like.
+    /// What was met before, known by where it stands: data that is pointed at, and containers.
     struct Place {
-        std::span<const std::byte> bytes;
+        const void* start;
+        std::size_t size; ///< of data; 0 for a container
         Index object;
+        unsigned height = 0;      ///< of a container: how many there are below each other in it
+        std::size_t expanded = 0; ///< objects in a container, counted each time that they are referred to
     };
     struct Container {
         Kind kind;
@@ -102,14 +103,34 @@ private:
         }
     }
 
+    /// A container that was met before is referred to again. None can hold itself: values do not change.
     bool addContainer(const Value& value, unsigned depth, Index& index) {
         if (depth == m_nesting) return fail("nested too deeply");
-        const std::size_t size = value.size();
-        const std::size_t keys = value.isDictionary() ? size : 0;
-        std::size_t at = m_references.size();
+        const auto visited = m_visited;
+        const auto [place, isNew] = placeOf(Access::identity(value), 0);
+        if (!isNew) return referAgain(m_places[place], depth, index);
+        const auto deepest = std::exchange(m_deepest, depth);
         index = newObject({});
-        m_containers.push_back(
-            {value.isDictionary() ? Kind::dictionary : Kind::array, index, size, keys + size, at});
+        m_places[place].object = index;
+        if (!addContents(value, depth, index)) return false;
+        m_places[place].expanded = m_visited - visited;
+        m_places[place].height = m_deepest - depth;
+        m_deepest = std::max(m_deepest, deepest);
+        return true;
+    }
+
+    bool referAgain(const Place& place, unsigned depth, Index& index) {
+        index = place.object;
+        m_deepest = std::max(m_deepest, depth + place.height);
+        return m_deepest < m_nesting ? count(place.expanded) : fail("nested too deeply");
+    }
+
+    bool addContents(const Value& value, unsigned depth, Index index) {
+        const std::size_t size = value.size();
+        const bool isDictionary = value.isDictionary();
+        const std::size_t keys = isDictionary ? size : 0;
+        std::size_t at = m_references.size();
+        m_containers.push_back({isDictionary ? Kind::dictionary : Kind::array, index, size, keys + size, at});
         m_references.resize(at + keys + size);
 
         if (!count(keys)) return false;
@@ -169,45 +190,50 @@ private:
         const auto head = token.bytes();
         const std::size_t size = head.size() + content.size();
         const auto isSame = [&](Index known) {
-            const Object& object = m_objects[known];
-            return object.size == size && isAt(m_out.at(object.mark), head) &&
-                   isAt(m_out.at(object.mark) + head.size(), content);
+            // The head tells the size, so whatever starts alike is alike.
+            const std::size_t mark = m_objects[known].mark;
+            return m_out.mark() - mark >= size && isAt(m_out.at(mark), head) &&
+                   isAt(m_out.at(mark) + head.size(), content);
         };
         const Index known = m_leaves.findOrAdd(hashOf(content), nextObject(), Uniquer::kForEver, isSame);
         if (known != Uniquer::kNone) return known;
-        const Index index = newObject({m_out.size(), size, m_out.mark(), nullptr});
-        m_out.put(head);
-        m_out.put(content);
+        const Index index = newObject({m_out.size(), m_out.mark()});
+        store(store(m_out.extend(size), head), content);
         return index;
     }
 
     /// The same for data that is pointed at.
     Index addPiece(const Token& head, std::span<const std::byte> bytes) {
-        const auto isThere = [&](Index known) {
-            return m_places[known].bytes.data() == bytes.data() &&
-                   m_places[known].bytes.size() == bytes.size();
-        };
-        const auto next = static_cast<Index>(m_places.size());
-        const Index place =
-            m_knownPlaces.findOrAdd(hashOf(bytes.data(), bytes.size()), next, Uniquer::kForEver, isThere);
-        if (place != Uniquer::kNone) return m_places[place].object;
-        const Index object = addContent(head, bytes);
-        m_places.push_back({bytes, object});
-        return object;
+        const auto [place, isNew] = placeOf(bytes.data(), bytes.size());
+        if (isNew) m_places[place].object = addContent(head, bytes, place);
+        return m_places[place].object;
     }
 
-    Index addContent(const Token& head, std::span<const std::byte> bytes) {
+    Index addContent(const Token& head, std::span<const std::byte> bytes, Index place) {
         // Bounded: to write data twice does no harm, to compare megabytes with everything does.
         constexpr unsigned kPatience = 4;
         const auto isSame = [&](Index known) {
-            return m_objects[known].size == bytes.size() && isAt(m_objects[known].elsewhere, bytes);
+            const Place& other = m_places[known];
+            return other.size == bytes.size() && std::memcmp(other.start, bytes.data(), bytes.size()) == 0;
         };
-        const Index known = m_contents.findOrAdd(sampledHashOf(bytes), nextObject(), kPatience, isSame);
-        if (known != Uniquer::kNone) return known;
-        const Index index = newObject({m_out.size(), bytes.size(), 0, bytes.data()});
+        const Index known = m_contents.findOrAdd(sampledHashOf(bytes), place, kPatience, isSame);
+        if (known != Uniquer::kNone) return m_places[known].object;
+        const Index index = newObject({m_out.size(), 0});
         m_out.put(head.bytes());
         m_out.putElsewhere(bytes);
         return index;
+    }
+
+    /// Where it is in `m_places`, and whether only now.
+    std::pair<Index, bool> placeOf(const void* start, std::size_t size) {
+        const auto isThere = [&](Index known) {
+            return m_places[known].start == start && m_places[known].size == size;
+        };
+        const auto next = static_cast<Index>(m_places.size());
+        const Index known = m_knownPlaces.findOrAdd(hashOf(start, size), next, Uniquer::kForEver, isThere);
+        if (known != Uniquer::kNone) return {known, false};
+        m_places.push_back({start, size, 0});
+        return {next, true};
     }
 
     static bool isAt(const std::byte* place, std::span<const std::byte> bytes) {
@@ -250,17 +276,21 @@ private:
     const std::size_t m_byteLimit;
     const unsigned m_nesting;
     std::string& m_error;
-    Output m_out;
+    Output m_out{512};
     std::string m_scratch;
     std::vector<std::byte> m_units;
-    std::vector<Object> m_objects;
-    std::vector<Container> m_containers;
-    std::vector<Index> m_references; ///< of all containers; of dictionaries the keys, then the values
-    Uniquer m_leaves;
-    std::vector<Place> m_places;
-    Uniquer m_knownPlaces;
-    Uniquer m_contents;
+    std::byte m_room[4096]; ///< a small message needs no other memory
+    std::pmr::monotonic_buffer_resource m_memory{m_room, sizeof m_room};
+    std::pmr::vector<Object> m_objects{&m_memory};
+    std::pmr::vector<Container> m_containers{&m_memory};
+    std::pmr::vector<Index> m_references{
+        &m_memory}; ///< of all containers; of dictionaries the keys, then the values
+    std::pmr::vector<Place> m_places{&m_memory};
+    Uniquer m_leaves{m_memory};
+    Uniquer m_knownPlaces{m_memory};
+    Uniquer m_contents{m_memory};
     std::size_t m_visited = 0;
+    unsigned m_deepest = 0; ///< container in the one that is being added
 };
 
 } // namespace

@@ -90,6 +90,15 @@ std::string_view Access::text(const Value& value, std::string& scratch) {
     return {};
 }
 
+const void* Access::identity(const Value& container) {
+    if (const auto* array = std::get_if<std::shared_ptr<const Array>>(&container.m_content))
+        return array->get();
+    if (const auto* entries = std::get_if<std::shared_ptr<const Dictionary>>(&container.m_content))
+        return entries->get();
+    const auto* view = std::get_if<View>(&container.m_content);
+    return view ? view->object : nullptr;
+}
+
 std::span<const std::byte> Access::bytes(const Value& value) {
     if (const auto* data = std::get_if<Data>(&value.m_content)) return data->span();
     const auto* view = std::get_if<View>(&value.m_content);

@@ -96,6 +96,8 @@ struct Access {
     static std::string_view text(const Header& header, std::string& scratch);
     /// A dictionary's key, likewise. `index` must be below its size.
     static std::string_view keyAt(const Value& dictionary, std::size_t index, std::string& scratch);
+    /// Tells a container from all others of the same time; null for other types.
+    static const void* identity(const Value& container);
     /// What data holds, empty for other types.
     static std::span<const std::byte> bytes(const Value& value);
     static bool isNegative(const Value& integer) { return std::get<Integer>(integer.m_content).negative; }

@@ -4,6 +4,7 @@
 #include "lib/plist/Binary.h"
 #include "lib/plist/Value.h"
 
+#include <algorithm>
 #include <cstddef>
 #include <memory>
 #include <span>
@@ -12,16 +13,23 @@
 
 namespace plist {
 
+void Output::grow(std::size_t size) {
+    m_capacity = std::max(2 * m_capacity, m_used + size);
+    auto larger = std::make_unique_for_overwrite<std::byte[]>(m_capacity);
+    store(larger.get(), {m_own.get(), m_used});
+    m_own = std::move(larger);
+}
+
 Encoded Output::finish(const Value& holder) && {
     struct Kept {
-        std::vector<std::byte> own;
+        std::unique_ptr<std::byte[]> bytes;
         Value holder;
     };
     Encoded encoded;
     encoded.size = size();
     auto kept = std::make_shared<const Kept>(Kept{std::move(m_own), holder});
     encoded.pieces.reserve(2 * m_breaks.size() + 1);
-    const std::span<const std::byte> own = kept->own;
+    const std::span<const std::byte> own(kept->bytes.get(), m_used);
     std::size_t from = 0;
     for (const Break& each : m_breaks) {
         encoded.pieces.push_back(own.subspan(from, each.at - from));

@@ -7,6 +7,8 @@
 #include <bit>
 #include <cstddef>
 #include <cstdint>
+#include <cstring>
+#include <memory>
 #include <span>
 #include <vector>
 
@@ -24,6 +26,12 @@ inline std::byte* storeNumber(std::byte* to, std::uint64_t number, std::size_t s
     for (std::size_t i = size; i > 0; --i, number >>= 8)
         to[i - 1] = static_cast<std::byte>(number & 0xFF);
     return to + size;
+}
+
+/// Bytes, stored at `to`. Answers where they end.
+inline std::byte* store(std::byte* to, std::span<const std::byte> bytes) {
+    if (!bytes.empty()) std::memcpy(to, bytes.data(), bytes.size());
+    return to + bytes.size();
 }
 
 /// A small object being encoded: a number, or the head of something longer.
@@ -55,21 +63,25 @@ private:
 /// The bytes of a file, with stretches of it that stand elsewhere.
 class Output {
 public:
-    void reserve(std::size_t size) { m_own.reserve(size); }
-    std::size_t size() const { return m_own.size() + m_elsewhere; }
-    /// How much was put here, not elsewhere; and what stands there.
-    std::size_t mark() const { return m_own.size(); }
-    const std::byte* at(std::size_t mark) const { return m_own.data() + mark; }
+    explicit Output(std::size_t capacity)
+        : m_own(std::make_unique_for_overwrite<std::byte[]>(capacity))
+        , m_capacity(capacity) {}
 
-    void put(std::span<const std::byte> bytes) { m_own.insert(m_own.end(), bytes.begin(), bytes.end()); }
-    void putElsewhere(std::span<const std::byte> bytes) {
-        m_breaks.push_back({m_own.size(), bytes});
-        m_elsewhere += bytes.size();
-    }
+    std::size_t size() const { return m_used + m_elsewhere; }
+    /// How much was put here, not elsewhere; and what stands there.
+    std::size_t mark() const { return m_used; }
+    const std::byte* at(std::size_t mark) const { return m_own.get() + mark; }
+
     /// Room for so many bytes, to be filled before anything else is put.
     std::byte* extend(std::size_t size) {
-        m_own.resize(m_own.size() + size);
-        return m_own.data() + m_own.size() - size;
+        if (m_capacity - m_used < size) grow(size);
+        m_used += size;
+        return m_own.get() + m_used - size;
+    }
+    void put(std::span<const std::byte> bytes) { store(extend(bytes.size()), bytes); }
+    void putElsewhere(std::span<const std::byte> bytes) {
+        m_breaks.push_back({m_used, bytes});
+        m_elsewhere += bytes.size();
     }
 
     /// All of it; what stands elsewhere is held by `holder`.
@@ -81,7 +93,11 @@ private:
         std::span<const std::byte> bytes;
     };
 
-    std::vector<std::byte> m_own;
+    void grow(std::size_t size);
+
+    std::unique_ptr<std::byte[]> m_own;
+    std::size_t m_capacity;
+    std::size_t m_used = 0;
     std::vector<Break> m_breaks;
     std::size_t m_elsewhere = 0;
 };

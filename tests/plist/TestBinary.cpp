@@ -90,7 +90,7 @@ TEST(Binary, MalformedTextIsReplaced) {
     }
 }
 
-TEST(Binary, EqualLeavesAreWrittenOnce) {
+TEST(Binary, EqualLeavesAndSharedContainersAreWrittenOnce) {
     const Data icon = dataOf(std::string(100'000, 'i')), alike = dataOf(std::string(100'000, 'i'));
     Array icons;
     for (int i = 0; i < 4000; ++i)
@@ -108,6 +108,11 @@ TEST(Binary, EqualLeavesAreWrittenOnce) {
         several.push_back(several[i]);
     EXPECT_EQ(reread(several), Value(several));
     EXPECT_LT(written(several).size, 2'510'000u);
+
+    const Value item = Dictionary{{"title", "Editor"}, {"icons", Array(200, "icon")}};
+    const Value items = Dictionary{{"pinned", Array(50, item)}, {"all", Array(50, item)}};
+    EXPECT_EQ(reread(items), items);
+    EXPECT_LT(written(reread(items)).size, 500u);
 }
 
 TEST(Binary, DataIsNeverCopied) {
@@ -139,6 +144,14 @@ TEST(Binary, RefusesToWriteWhatCannotBeRead) {
     EXPECT_EQ(errorOf(Array{1, nullptr}), "nil cannot stand in a property list");
     EXPECT_EQ(errorOf(std::string(1000, 'x'), {.bytes = 1000}), "the property list is too large");
     EXPECT_EQ(errorOf(Array{1, 1, 1}, {.objects = 3}), "too many objects");
+
+    const Value shared = Array{Array{1}};
+    std::string error;
+    EXPECT_EQ(WriteBinary(Array{shared, shared}, error, {.objects = 7}).pieces.size(), 1u) << error;
+    EXPECT_EQ(errorOf(Array{shared, shared}, {.objects = 6}), "too many objects");
+    // Met first near the top, then again where it no longer fits.
+    EXPECT_EQ(errorOf(Array{shared, Array{Array{shared}}}, {.nesting = 4}), "nested too deeply");
+    EXPECT_EQ(WriteBinary(Array{shared, Array{Array{shared}}}, error, {.nesting = 5}).pieces.size(), 1u);
 
     Value deep = 1;
     for (unsigned i = 0; i < kDeepestNesting; ++i)

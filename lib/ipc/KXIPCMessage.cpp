@@ -21,10 +21,10 @@ KXIPCMessage KXIPCMessage::initWithInfo(const plist::Value& info) {
 }
 
 plist::Value KXIPCMessage::propertyList() const {
-    plist::Dictionary list;
-    if (m_name) list.set("name", *m_name);
-    if (m_object) list.set("object", *m_object);
-    return list.set("userInfo", m_userInfo);
+    const auto text = [](const std::optional<std::string>& string) {
+        return string ? plist::Value(*string) : plist::Value();
+    };
+    return plist::Dictionary{{"name", text(m_name)}, {"object", text(m_object)}, {"userInfo", m_userInfo}};
 }
 
 std::vector<std::size_t>

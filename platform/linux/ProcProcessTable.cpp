@@ -7,6 +7,7 @@
 #include "platform/linux/ProcRecords.h"
 
 #include <algorithm>
+#include <atomic>
 #include <csignal>
 #include <cstdint>
 #include <cstdlib>
@@ -14,6 +15,7 @@
 #include <iterator>
 #include <memory>
 #include <optional>
+#include <pthread.h>
 #include <signal.h>
 #include <string>
 #include <string_view>
@@ -40,6 +42,15 @@ std::vector<std::string> DirectoriesOf(const char* variable, const std::string& 
         rest.remove_prefix(std::min(end + 1, rest.size()));
     }
     return directories;
+}
+
+/// Without a call of the system: every message asks, and a call takes as long as writing a small one.
+int CurrentProcessID() {
+    static std::atomic<int> known = [] {
+        pthread_atfork(nullptr, nullptr, [] { known = getpid(); });
+        return getpid();
+    }();
+    return known;
 }
 
 int ProcessIDOf(ProcessSerialNumber process) {
@@ -90,8 +101,8 @@ ProcProcessTable::ProcProcessTable(MainLoop& mainLoop, const Clock& clock, const
     , m_applications(m_processes, clock, places.dataDirectories, places.programDirectories) {}
 
 std::optional<ProcessSerialNumber> ProcProcessTable::currentProcess() const {
-    // Every message asks: reading its record again would cost more than sending it.
-    const auto pid = static_cast<std::uint32_t>(getpid());
+    // Reading its record again would cost more than sending a message.
+    const auto pid = static_cast<std::uint32_t>(CurrentProcessID());
     const auto known = m_current.load();
     if (static_cast<std::uint32_t>(known) == pid)
         return ProcessSerialNumber{static_cast<std::uint32_t>(known >> 32), pid};

@@ -41,8 +41,8 @@ public:
     virtual ~LocalPort() = default; ///< closes; no thread may be in `run` any more
 
     /// Hands arrivals to `receiver` on the calling thread until `close`: in order, and those together that
-    /// were there together. Never none.
-    using Receiver = std::function<void(std::vector<Arrival>)>;
+    /// were there together. Never none. What the receiver does not move out ends when it returns.
+    using Receiver = std::function<void(std::span<Arrival>)>;
     virtual void run(const Receiver& receiver) = 0;
 
     /// Gives the name up at once, so that nobody reaches the port when this returns, and makes `run` return

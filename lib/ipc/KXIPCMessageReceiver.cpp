@@ -13,6 +13,7 @@
 #include <iterator>
 #include <memory>
 #include <mutex>
+#include <span>
 #include <string>
 #include <system_error>
 #include <thread>
@@ -69,11 +70,11 @@ private:
     }
 
     void workerThreadStartReceiving() {
-        m_port->run([this](std::vector<platform::Arrival> arrivals) {
-            std::vector<Delivery> group;
+        std::vector<Delivery> group;
+        m_port->run([&](std::span<platform::Arrival> arrivals) {
             for (auto& arrival : arrivals)
                 WorkerThreadOnMessageReceived(arrival, group);
-            forward(std::move(group));
+            forward(group);
             // Now the receipts of what was dropped end: no answer overtakes what came before.
         });
         forwardEnd();
@@ -98,14 +99,16 @@ private:
 
     void forwardEnd() {
         std::vector<Delivery> end(1);
-        forward(std::move(end));
+        forward(end);
     }
 
-    void forward(std::vector<Delivery> group) {
+    /// Empties the group.
+    void forward(std::vector<Delivery>& group) {
         if (group.empty()) return;
         {
             const std::lock_guard lock(m_mutex);
             std::ranges::move(group, std::back_inserter(m_inbox));
+            group.clear();
             if (std::exchange(m_isPosted, true)) return;
         }
         postDelivery();

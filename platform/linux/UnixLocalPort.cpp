@@ -58,6 +58,7 @@ UnixLocalPort::~UnixLocalPort() {
 
 void UnixLocalPort::run(const Receiver& receiver) {
     PacketReader reader;
+    std::vector<Arrival> group;
     std::array<epoll_event, 64> events;
     while (!m_closed) {
         const int count = epoll_wait(m_epoll.get(), events.data(), static_cast<int>(events.size()), -1);
@@ -67,8 +68,10 @@ void UnixLocalPort::run(const Receiver& receiver) {
                 resumePaused();
             else if (event.data.u64 == listenerTag)
                 accept();
-            else if (auto arrivals = read(event.data.u64, reader); !arrivals.empty())
-                receiver(std::move(arrivals));
+            else
+                read(event.data.u64, reader, group);
+            if (!group.empty()) receiver(group);
+            group.clear();
         }
     }
 }
@@ -120,11 +123,10 @@ void UnixLocalPort::refuseOne() {
 }
 
 /// What is there now, and little enough for the others to have their turn soon.
-std::vector<Arrival> UnixLocalPort::read(std::uint64_t tag, PacketReader& reader) {
-    std::vector<Arrival> group;
+void UnixLocalPort::read(std::uint64_t tag, PacketReader& reader, std::vector<Arrival>& group) {
     const std::lock_guard lock(m_mutex);
     const auto found = m_connections.find(tag);
-    if (found == m_connections.end()) return group;
+    if (found == m_connections.end()) return;
     const auto connection = found->second;
     bool isOver = false, isWaitedFor = false;
     // Whoever waits for an answer has sent nothing after it.
@@ -139,7 +141,6 @@ std::vector<Arrival> UnixLocalPort::read(std::uint64_t tag, PacketReader& reader
         if (auto arrival = take(connection, std::move(packet))) group.push_back(std::move(*arrival));
     }
     if (isOver) remove(tag);
-    return group;
 }
 
 bool UnixLocalPort::readPacket(const IncomingConnection& connection, PacketReader& reader,

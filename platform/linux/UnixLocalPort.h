@@ -35,7 +35,7 @@ private:
     void watch(int descriptor, std::uint64_t tag);
     void accept();
     void refuseOne();
-    std::vector<Arrival> read(std::uint64_t tag, PacketReader& reader);
+    void read(std::uint64_t tag, PacketReader& reader, std::vector<Arrival>& group);
     bool readPacket(const IncomingConnection& connection, PacketReader& reader, IncomingPacket& packet,
                     bool& isOver);
     std::optional<Arrival> take(const std::shared_ptr<IncomingConnection>& connection, IncomingPacket packet);

@@ -47,7 +47,7 @@ public:
         , m_port(ports.open(name))
         , m_thread([this] {
             if (!m_port) return;
-            m_port->run([this](std::vector<platform::Arrival> arrivals) {
+            m_port->run([this](std::span<platform::Arrival> arrivals) {
                 for (auto& arrival : arrivals)
                     take(std::move(arrival));
             });

@@ -59,7 +59,7 @@ TYPED_TEST(PortContract, givesANameToOneOwnerUntilItCloses) {
     EXPECT_TRUE(second);
     first->close();
     EXPECT_TRUE(server.isListening(name));
-    first->run([](const std::vector<Arrival>&) { FAIL(); });
+    first->run([](std::span<Arrival>) { FAIL(); });
 }
 
 TYPED_TEST(PortContract, synchronousSendWaitsForTheReceipt) {

@@ -27,7 +27,7 @@ std::size_t OpenDescriptors() {
 /// So many messages, or somewhat more; closes the port.
 std::vector<std::string> Read(LocalPort& port, std::size_t count) {
     std::vector<std::string> texts;
-    port.run([&](const std::vector<Arrival>& arrivals) {
+    port.run([&](std::span<Arrival> arrivals) {
         for (const auto& arrival : arrivals)
             texts.emplace_back(reinterpret_cast<const char*>(arrival.bytes.data()), arrival.bytes.size());
         if (texts.size() >= count) port.close();
@@ -91,7 +91,7 @@ TEST_F(UnixPorts, knowTheSenderAlsoAfterItHasEnded) {
     Child dead([&] { Send(*client.connect(name), "dead"); });
     const auto livingPeer = SerialNumberOfPeer(living.pid());
     dead.end();
-    port->run([&, seen = 0](const std::vector<Arrival>& arrivals) mutable {
+    port->run([&, seen = 0](std::span<Arrival> arrivals) mutable {
         const auto& arrival = arrivals.front(); // of two senders
         const bool isDead = arrival.bytes.size() == 4;
         EXPECT_EQ(arrival.sender.processID, isDead ? dead.pid() : living.pid());

@@ -40,7 +40,8 @@ struct InMemoryLocalPort final : LocalPort {
             if (mailbox->closed) return;
             auto letters = std::exchange(mailbox->letters, {});
             lock.unlock();
-            receiver(std::move(letters));
+            receiver(letters);
+            letters.clear();
             lock.lock();
         }
     }

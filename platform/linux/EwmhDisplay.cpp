@@ -8,6 +8,7 @@
 #include <cstdint>
 #include <cstring>
 #include <span>
+#include <utility>
 #include <vector>
 #include <xcb/res.h>
 #include <xcb/xcb.h>
@@ -91,15 +92,18 @@ EwmhDisplay::Numbers EwmhDisplay::processesByConnection(std::span<const xcb_wind
     Numbers processes(windows.size());
     const auto* extension = xcb_get_extension_data(c, &xcb_res_id);
     if (!extension || !extension->present) return processes;
-    std::vector<xcb_res_query_client_ids_cookie_t> cookies;
+    std::vector<std::pair<xcb_get_geometry_cookie_t, xcb_res_query_client_ids_cookie_t>> cookies;
     for (const auto window : windows) {
         const xcb_res_client_id_spec_t question{window, XCB_RES_CLIENT_ID_MASK_LOCAL_CLIENT_PID};
-        cookies.push_back(xcb_res_query_client_ids(c, 1, &question));
+        cookies.emplace_back(xcb_get_geometry(c, window), xcb_res_query_client_ids(c, 1, &question));
     }
     for (std::size_t i = 0; i < windows.size(); ++i) {
+        const XcbReply<xcb_get_geometry_reply_t> geometry(
+            xcb_get_geometry_reply(c, cookies[i].first, nullptr));
         const XcbReply<xcb_res_query_client_ids_reply_t> reply(
-            xcb_res_query_client_ids_reply(c, cookies[i], nullptr));
-        if (!reply) continue;
+            xcb_res_query_client_ids_reply(c, cookies[i].second, nullptr));
+        // The window may have gone, and its number be of the next one to connect: often of this connection.
+        if (!geometry || !reply) continue;
         const auto ids = xcb_res_query_client_ids_ids_iterator(reply.get());
         if (ids.rem > 0 && xcb_res_client_id_value_value_length(ids.data) > 0)
             processes[i] = *xcb_res_client_id_value_value(ids.data);

@@ -5,7 +5,7 @@
 #include "lib/plist/Binary.h"
 #include "lib/plist/Output.h"
 #include "platform/linux/Backlog.h"
-#include "tests/rounds/Worker.h"
+#include "tests/rounds/Program.h"
 #include "tests/support/MappedMessages.h"
 #include "tests/support/ScratchHome.h"
 

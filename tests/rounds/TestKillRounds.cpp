@@ -1,6 +1,6 @@
 #include "lib/ipc/KXIPCClient.h"
 #include "lib/ipc/KXIPCServer.h"
-#include "tests/rounds/Worker.h"
+#include "tests/rounds/Program.h"
 #include "tests/support/MappedMessages.h"
 #include "tests/support/ScratchHome.h"
 

@@ -1,4 +1,4 @@
-#include "tests/rounds/Worker.h"
+#include "tests/rounds/Program.h"
 #include "tests/support/ScratchHome.h"
 
 #include <algorithm>

@@ -4,17 +4,14 @@
 #include "platform/linux/LinuxPorts.h"
 #include "platform/linux/PollMainLoop.h"
 #include "platform/linux/ProcProcessTable.h"
+#include "tests/platform/Child.h"
 
 #include <chrono>
-#include <csignal>
 #include <functional>
 #include <gtest/gtest.h>
 #include <new>
 #include <sys/mman.h>
-#include <sys/prctl.h>
-#include <sys/wait.h>
 #include <thread>
-#include <unistd.h>
 
 /// What the processes of a test share, until they end: a plain structure of atomics.
 template <class Contents>
@@ -22,31 +19,6 @@ Contents& Shared() {
     constexpr int access = PROT_READ | PROT_WRITE, kind = MAP_SHARED | MAP_ANONYMOUS;
     return *new (mmap(nullptr, sizeof(Contents), access, kind, -1, 0)) Contents;
 }
-
-/// A process that works until it is killed. Started by a process of one thread.
-class Worker {
-public:
-    explicit Worker(const std::function<void()>& work)
-        : m_pid(fork()) {
-        if (m_pid != 0) return;
-        prctl(PR_SET_PDEATHSIG, SIGKILL);
-        work();
-        _exit(1);
-    }
-    ~Worker() { end(); }
-    Worker(const Worker&) = delete;
-    Worker& operator=(const Worker&) = delete;
-
-    pid_t pid() const { return m_pid; }
-    void end() {
-        if (m_pid > 0) kill(m_pid, SIGKILL);
-        if (m_pid > 0) waitpid(m_pid, nullptr, 0);
-        m_pid = 0;
-    }
-
-private:
-    pid_t m_pid;
-};
 
 /// What takes part in a process of its own.
 struct Program {

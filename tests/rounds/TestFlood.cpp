@@ -25,7 +25,7 @@ struct Kind {
     std::size_t size;
     std::uint32_t unanswered; ///< so many are sent at once: as many as a sender keeps
 };
-constexpr Kind kinds[] = {{"small", 200'000, 10, 60'000}, {"large", 4'000, 1'000'000, 100}};
+constexpr Kind kinds[] = {{"small", 1'000'000, 10, 60'000}, {"large", 10'000, 1'000'000, 100}};
 
 struct State {
     std::atomic<bool> isServing = false;

@@ -98,13 +98,19 @@ inline std::vector<RawPacket> BadPackets() {
     EXPECT_EQ(pipe2(pipeEnds, O_CLOEXEC), 0);
     const auto pipe = std::make_shared<Descriptor>(pipeEnds[0]);
     const Descriptor otherEnd(pipeEnds[1]);
-    constexpr auto terabyte = std::size_t{1} << 40;
-    const auto sparse = Memory("", 0);
-    EXPECT_EQ(ftruncate(sparse->get(), terabyte), 0);
-    EXPECT_EQ(fcntl(sparse->get(), F_ADD_SEALS, allSeals), 0);
+    const auto sparse = [](const char* what, std::size_t size) {
+        const auto memory = Memory("", 0);
+        EXPECT_EQ(ftruncate(memory->get(), static_cast<off_t>(size)), 0);
+        EXPECT_EQ(fcntl(memory->get(), F_ADD_SEALS, allSeals), 0);
+        return RawPacket{what, RawHeader({.flags = inMemory, .payloadLength = size}), {memory}};
+    };
     const auto memoryHeader = RawHeader({.flags = inMemory, .payloadLength = 7});
     const std::string tooLong(platform::maximalInlinePayload + 1, 'x');
     std::vector<RawPacket> packets{
+        {"another magic", RawHeader({.magic = {'K', 'X', 'P', 'D'}})},
+        {"another version", RawHeader({.version = 2})},
+        {"an unknown flag", RawHeader({.flags = 32})},
+        {"a length too large by one", RawHeader({.payloadLength = 8}) + "payload"},
         {"a copy", RawHeader({.flags = PacketHeader::tap | PacketHeader::outgoing})},
         {"an answer", RawHeader({.flags = PacketHeader::isAnswer})},
         {"more than goes inline", RawHeader({.payloadLength = tooLong.size()}) + tooLong},
@@ -118,7 +124,8 @@ inline std::vector<RawPacket> BadPackets() {
         {"empty memory", RawHeader({.flags = inMemory}), {Memory("", allSeals)}},
         {"memory too small", RawHeader({.flags = inMemory, .payloadLength = 8}), {sealed}},
         {"memory too large", RawHeader({.flags = inMemory, .payloadLength = 6}), {sealed}},
-        {"a sparse terabyte", RawHeader({.flags = inMemory, .payloadLength = terabyte}), {sparse}},
+        sparse("a byte more than the largest", platform::maximalPayload + 1),
+        sparse("a sparse terabyte", std::size_t{1} << 40),
     };
     for (const int missing : {F_SEAL_SEAL, F_SEAL_SHRINK, F_SEAL_GROW, F_SEAL_WRITE})
         packets.push_back({"a seal missing", memoryHeader, {Memory("payload", allSeals & ~missing)}});

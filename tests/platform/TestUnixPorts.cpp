@@ -168,8 +168,9 @@ TEST_F(UnixPorts, cutOffPeersThatSendWhatIsNoPacket) {
     }
     EXPECT_TRUE(listener.arrivals().empty());
 
-    // Who says nothing holds up nobody, and costs no entry; half a header does.
+    // Who says nothing holds up nobody, and costs no entry, nor does who goes at once; half a header does.
     RawPeer silent(directory, name), half(directory, name);
+    RawPeer(directory, name);
     half.send({"half a header", RawHeader({}).substr(0, sizeof(PacketHeader) / 2)});
     EXPECT_TRUE(half.isCutOff());
     EXPECT_EQ(ScratchHome::logged("too short\n"), 1);
@@ -220,4 +221,20 @@ TEST_F(UnixPorts, takePacketsFromTheProcessThatConnectedAlone) {
     }
     EXPECT_EQ(ScratchHome::logged("sent by another process"), 2);
     EXPECT_TRUE(listener.arrivals().empty());
+}
+
+TEST_F(UnixPorts, takeNoConnectionOfAnotherUser) {
+    if (geteuid() != 0) GTEST_SKIP() << "only root can become another user";
+    const std::string theirs = home.path() / "theirs";
+    std::filesystem::permissions(home.path(), std::filesystem::perms::all);
+    ASSERT_EQ(seteuid(65534), 0);
+    UnixMessagePorts ports(loop, clock, theirs);
+    const auto port = ports.open(name);
+    ASSERT_EQ(seteuid(0), 0);
+    ASSERT_TRUE(port);
+    auto reading = std::async(std::launch::async, Read, std::ref(*port), 1);
+    EXPECT_TRUE(RawPeer(theirs, name).isCutOff());
+    port->close();
+    EXPECT_TRUE(reading.get().empty());
+    EXPECT_EQ(ScratchHome::logged(": another user's\n"), 1);
 }

@@ -1,9 +1,7 @@
 #include "lib/base/CheckedMalloc.h"
 #include "lib/base/Log.h"
-#include "lib/base/LogLimit.h"
 #include "tests/support/ScratchHome.h"
 
-#include <chrono>
 #include <csignal>
 #include <cstdint>
 #include <gtest/gtest.h>
@@ -97,23 +95,6 @@ TEST(CheckedMalloc, PanicsOnlyWhenThereIsNoMemory) {
     for (const auto& text : {failure + "a.cpp:7\n", failure + "b.cpp:8.  Bug number: 42\n"})
         EXPECT_EQ(ScratchHome::logged(text), 1) << ScratchHome::log();
     EXPECT_EQ(ScratchHome::logged("*** Panic: Backtrace\n"), 2);
-}
-
-TEST(LogLimit, LetsTenEntriesAMinuteThrough) {
-    LogLimit limit;
-    LogLimit::Instant now{};
-    const auto allowed = [&](int processID) {
-        int count = 0;
-        for (int i = 0; i < 100; ++i)
-            count += limit.allows(processID, now);
-        return count;
-    };
-    EXPECT_EQ(allowed(1), 10);
-    EXPECT_EQ(allowed(2), 10);
-    now += std::chrono::seconds(59);
-    EXPECT_EQ(allowed(1), 0);
-    now += std::chrono::seconds(1);
-    EXPECT_EQ(allowed(1), 10);
 }
 
 } // namespace

@@ -83,10 +83,10 @@ TEST_F(PortWatchesTest, NeverMakeTheWatchedWaitAndKnowWhatTheyMissed) {
     // Who asks again and again is told how it is each time, and gets one copy.
     RawPeer eager(directory, "a");
     std::array<char, 1000> packet;
-    for (int i = 0; i < 3; ++i)
+    for (int i = 0; i < 3; ++i) {
         eager.send({"a request", RawHeader({.flags = PacketHeader::tap})});
-    for (int i = 0; i < 3; ++i)
         EXPECT_GT(eager.receive(packet.data(), packet.size()), 100);
+    }
     for (const char sent : {'x', 'y'}) {
         Send(*toA, {sent}, true);
         EXPECT_EQ(eager.receive(packet.data(), packet.size()), 25);

@@ -1,6 +1,6 @@
+#include "fuzz/Quiet.h"
 #include "tests/plist/RawFile.h"
 
-#include <algorithm>
 #include <bit>
 #include <gtest/gtest.h>
 
@@ -23,16 +23,6 @@ Data bomb(std::size_t levels, std::size_t width) {
         file.objects.push_back(RawFile::array(times(width, i)));
     file.objects.push_back("\x09");
     return file.build();
-}
-
-/// Everything a reader may ask of a value. Answers the bytes it got.
-std::size_t readAll(const Value& value) {
-    std::size_t read = value.stringOr({}).size() + value["key"].size();
-    const Data data = value.data();
-    read += static_cast<std::size_t>(std::ranges::count(data.span(), std::byte{}));
-    for (std::size_t i = 0; i < value.size(); ++i)
-        read += value.keyAt(i).size() + readAll(value.at(i));
-    return read;
 }
 
 TEST(HostileBinary, MalformedFilesAreRefused) {
@@ -141,7 +131,6 @@ TEST(HostileBinary, EveryCutAndEveryChangeOfAByteIsSafe) {
     for (std::size_t size = 0; size < whole.size(); ++size)
         EXPECT_NE(errorOf(whole.substr(0, size)), "");
 
-    std::size_t read = 0;
     for (std::size_t at = 0; at < whole.size(); ++at) {
         for (unsigned change = 1; change < 256; ++change) {
             std::string changed = whole;
@@ -150,12 +139,13 @@ TEST(HostileBinary, EveryCutAndEveryChangeOfAByteIsSafe) {
             const Value value = Parse(dataOf(changed), error);
             EXPECT_EQ(value.isNil(), !error.empty());
             if (value.isNil()) continue;
-            read += readAll(value) + value.description().size();
+            ReadAll(value);
+            g_seen = g_seen + value.description().size();
             if (!std::has_single_bit(change)) continue;
             ASSERT_EQ(reread(value), value) << "byte " << at << " changed by " << change;
         }
     }
-    EXPECT_GT(read, 0u);
+    EXPECT_GT(g_seen, 0u);
 }
 
 } // namespace

@@ -73,5 +73,9 @@ void blend(RasterRows<std::uint8_t> to, const std::uint8_t* a, const std::uint8_
            std::span<const std::uint8_t> weights, std::size_t count);
 void planLinear(LinearPlan& plan);
 void sampleLinear(std::uint8_t* to, const std::uint8_t* from, const LinearPlan& plan);
+void sampleBox(RasterRows<std::uint8_t> to, RasterRows<const std::uint8_t> from, std::size_t rows,
+               Sampling sampling, std::size_t count);
+void averageRows(std::uint8_t* to, const std::uint8_t* const* rows, const BoxRun& run, std::uint32_t step,
+                 std::size_t count);
 
 } // namespace raster::avx2

@@ -144,6 +144,16 @@ public:
         if (m_way == Axis::Way::linear && rowOps().planLinear) rowOps().planLinear(m_plan);
     }
     std::size_t width() const { return static_cast<std::size_t>(m_plan.count); }
+    /// How many neighbours are made together.
+    std::size_t bandRows() const { return m_way == Axis::Way::box ? raster::RowOps::mostBoxRows : 1; }
+    /// Rows y ... y + count - 1, at most a band.
+    void scaleRows(RasterRows<std::uint8_t> to, std::int64_t y, std::size_t count) const {
+        if (m_way == Axis::Way::box && m_source.format.bytes() == 4)
+            return rowOps().sampleBox(to, {m_source.row(y), m_source.bytesPerRow}, count, m_plan.sampling,
+                                      width());
+        for (; count > 0; --count, ++y, to.data += to.bytesPerRow)
+            scaleRow(to.data, y);
+    }
     void scaleRow(std::uint8_t* to, std::int64_t y) const {
         const std::uint8_t* const from = m_source.row(y);
         if (m_source.format.bytes() != 4)
@@ -154,7 +164,7 @@ public:
         case Axis::Way::linear:
             return rowOps().sampleLinear(to, from, m_plan);
         case Axis::Way::box:
-            return rowOps().sampleBox(to, from, m_plan.sampling, width());
+            return rowOps().sampleBox({to, 0}, {from, 0}, 1, m_plan.sampling, width());
         }
     }
 
@@ -164,34 +174,41 @@ private:
     LinearPlan m_plan;
 };
 
-/// Scaled source rows; row r stands in entry r modulo the number of entries. No vector of a row crosses two
-/// cache lines.
+/// Scaled source rows, made in bands; band b stands in slot b modulo the number of slots. No vector of a row
+/// crosses two cache lines.
 class RowCache {
     static constexpr std::size_t lineBytes = 64;
 
 public:
-    /// `spareRows` rows more stand behind the entries.
-    RowCache(const RowScaler& scaler, std::size_t entries, std::size_t spareRows)
+    /// Holds any `rows` neighbours at once; `spareRows` rows more stand behind them.
+    RowCache(const RowScaler& scaler, int sourceHeight, std::size_t rows, std::size_t spareRows)
         : m_scaler(scaler)
+        , m_height(sourceHeight)
+        , m_bandRows(scaler.bandRows())
         , m_rowBytes((scaler.width() * 4 + 4 + lineBytes - 1) / lineBytes * lineBytes)
-        , m_entries(entries)
+        , m_slots((rows + m_bandRows - 2) / m_bandRows + 1)
         , m_memory(static_cast<std::uint8_t*>(CheckedMalloc(
-              -1, entries * sizeof(std::int64_t) + lineBytes + (entries + spareRows) * m_rowBytes,
+              -1,
+              m_slots * sizeof(std::int64_t) + lineBytes + (m_slots * m_bandRows + spareRows) * m_rowBytes,
               "lib/raster/rasterScale", 188))) {
         const std::int64_t none = -1;
-        for (std::size_t i = 0; i < entries; ++i)
+        for (std::size_t i = 0; i < m_slots; ++i)
             std::memcpy(held(i), &none, sizeof none);
     }
 
-    std::uint8_t* spareRow() { return memoryOf(m_entries); }
+    std::uint8_t* spareRow() { return rowAt(m_slots * m_bandRows); }
 
     const std::uint8_t* row(std::int64_t y) {
-        const std::size_t entry = static_cast<std::uint32_t>(y) % static_cast<std::uint32_t>(m_entries);
-        std::uint8_t* const pixels = memoryOf(entry);
-        if (std::memcmp(held(entry), &y, sizeof y) == 0) return pixels;
-        std::memcpy(held(entry), &y, sizeof y);
-        m_scaler.scaleRow(pixels, y);
-        return pixels;
+        const std::int64_t band = static_cast<std::uint32_t>(y) / static_cast<std::uint32_t>(m_bandRows);
+        const std::size_t slot = static_cast<std::uint32_t>(band) % static_cast<std::uint32_t>(m_slots);
+        const auto first = band * static_cast<std::int64_t>(m_bandRows);
+        std::uint8_t* const pixels = rowAt(slot * m_bandRows);
+        if (std::memcmp(held(slot), &band, sizeof band) != 0) {
+            std::memcpy(held(slot), &band, sizeof band);
+            m_scaler.scaleRows({pixels, static_cast<std::ptrdiff_t>(m_rowBytes)}, first,
+                               std::min(m_bandRows, static_cast<std::size_t>(m_height - first)));
+        }
+        return pixels + static_cast<std::size_t>(y - first) * m_rowBytes;
     }
 
 private:
@@ -202,15 +219,17 @@ private:
         }
     };
 
-    std::uint8_t* held(std::size_t entry) { return m_memory.get() + entry * sizeof(std::int64_t); }
-    std::uint8_t* memoryOf(std::size_t entry) {
-        std::uint8_t* const rows = m_memory.get() + m_entries * sizeof(std::int64_t);
-        return rows + -reinterpret_cast<std::uintptr_t>(rows) % lineBytes + entry * m_rowBytes;
+    std::uint8_t* held(std::size_t slot) { return m_memory.get() + slot * sizeof(std::int64_t); }
+    std::uint8_t* rowAt(std::size_t index) {
+        std::uint8_t* const rows = m_memory.get() + m_slots * sizeof(std::int64_t);
+        return rows + -reinterpret_cast<std::uintptr_t>(rows) % lineBytes + index * m_rowBytes;
     }
 
     const RowScaler& m_scaler;
+    std::int64_t m_height;
+    std::size_t m_bandRows;
     std::size_t m_rowBytes;
-    std::size_t m_entries;
+    std::size_t m_slots;
     std::unique_ptr<std::uint8_t, Freed> m_memory;
 };
 
@@ -252,7 +271,7 @@ std::int64_t scaleColumns(const Rows& rows, RowCache& cache, const Axis& axis, i
     return 1;
 }
 
-std::size_t cacheEntries(const Axis& vertical, bool filtering) {
+std::size_t cachedRows(const Axis& vertical, bool filtering) {
     if (!filtering) return 1;
     const std::uint64_t rows = ((static_cast<std::uint64_t>(vertical.step) + 0xFFFF) >> 16) + 1;
     // Not 1, which a step of 0 would give: two neighbours are blended even then.
@@ -285,7 +304,7 @@ void scaleInto(const Destination& to, const RasterRect& rect, const Source& from
     const RowScaler scaler(from, horizontal, rect.width());
     if (direct && vertical.way == Axis::Way::nearest)
         return scaleRowsInto(to, rect, scaler, vertical, from.height);
-    RowCache cache(scaler, cacheEntries(vertical, filtering), direct ? 0 : 1);
+    RowCache cache(scaler, from.height, cachedRows(vertical, filtering), direct ? 0 : 1);
     for (std::int64_t y = rect.top; y < rect.bottom;) {
         std::uint8_t* row = to.row(y) + rect.left * pixelBytes;
         std::uint8_t* words = direct ? row : cache.spareRow();

@@ -86,7 +86,7 @@ void sampleLinear(std::uint8_t* to, const std::uint8_t* from, const LinearPlan& 
     }
 }
 
-void sampleBox(std::uint8_t* to, const std::uint8_t* from, Sampling s, std::size_t count) {
+void sampleBoxRow(std::uint8_t* to, const std::uint8_t* from, Sampling s, std::size_t count) {
     const std::uint64_t reciprocal = BoxSum::reciprocalOf(s.step);
     for (; count > 0; --count, to += pixelBytes, s.position += s.step) {
         const BoxRun run = boxRun(s.position, s.step);
@@ -97,6 +97,12 @@ void sampleBox(std::uint8_t* to, const std::uint8_t* from, Sampling s, std::size
         }
         store(to, sum.average(reciprocal));
     }
+}
+
+void sampleBox(RasterRows<std::uint8_t> to, RasterRows<const std::uint8_t> from, std::size_t rows, Sampling s,
+               std::size_t count) {
+    for (; rows > 0; --rows, to.data += to.bytesPerRow, from.data += from.bytesPerRow)
+        sampleBoxRow(to.data, from.data, s, count);
 }
 
 void averageRows(std::uint8_t* to, const std::uint8_t* const* rows, const BoxRun& run, std::uint32_t step,

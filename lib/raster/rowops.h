@@ -81,7 +81,10 @@ struct RowOps {
     /// Completes a plan; may be null.
     void (*planLinear)(LinearPlan& plan);
     void (*sampleLinear)(std::uint8_t* to, const std::uint8_t* from, const LinearPlan& plan);
-    void (*sampleBox)(std::uint8_t* to, const std::uint8_t* from, Sampling sampling, std::size_t count);
+    static constexpr std::size_t mostBoxRows = 8;
+    /// The same boxes of 1 to `mostBoxRows` rows.
+    void (*sampleBox)(RasterRows<std::uint8_t> to, RasterRows<const std::uint8_t> from, std::size_t rows,
+                      Sampling sampling, std::size_t count);
     /// The average of `run.count` rows; `rows` is parallel to the weights.
     void (*averageRows)(std::uint8_t* to, const std::uint8_t* const* rows, const BoxRun& run,
                         std::uint32_t step, std::size_t count);

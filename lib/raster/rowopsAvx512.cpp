@@ -229,9 +229,7 @@ KX_AVX512 inline Sums boxSums(const std::uint8_t* from, Vector positions, std::u
     return sums;
 }
 
-KX_AVX512 void sampleBox(std::uint8_t* to, const std::uint8_t* from, Sampling s, std::size_t count) {
-    // Two or four whole pixels need no gathering.
-    if (s.step == 0x20000 || s.step == 0x40000) return avx2::rowOps.sampleBox(to, from, s, count);
+KX_AVX512 void sampleBoxRow(std::uint8_t* to, const std::uint8_t* from, Sampling s, std::size_t count) {
     const std::int64_t room = (std::int64_t{s.sourceCount} << 16) - s.position;
     const std::int64_t within =
         s.position < 0 || room < 0 ? 0 : std::min(static_cast<std::int64_t>(count), room / s.step);
@@ -246,7 +244,15 @@ KX_AVX512 void sampleBox(std::uint8_t* to, const std::uint8_t* from, Sampling s,
     // The last vector may have gone beyond.
     const std::int64_t beyond = (within + lanes - 1) / lanes * lanes - within;
     s.position -= beyond * s.step;
-    scalarRowOps.sampleBox(to - beyond * 4, from, s, count - static_cast<std::size_t>(within));
+    scalarRowOps.sampleBox({to - beyond * 4, 0}, {from, 0}, 1, s, count - static_cast<std::size_t>(within));
+}
+
+KX_AVX512 void sampleBox(RasterRows<std::uint8_t> to, RasterRows<const std::uint8_t> from, std::size_t rows,
+                         Sampling s, std::size_t count) {
+    // Two or four whole pixels need no gathering.
+    if (s.step == 0x20000 || s.step == 0x40000) return avx2::rowOps.sampleBox(to, from, rows, s, count);
+    for (; rows > 0; --rows, to.data += to.bytesPerRow, from.data += from.bytesPerRow)
+        sampleBoxRow(to.data, from.data, s, count);
 }
 
 KX_AVX512 void averageRows(std::uint8_t* to, const std::uint8_t* const* rows, const BoxRun& run,

@@ -74,7 +74,7 @@ void expectSameOnAllTables(unsigned seed, auto&& job) {
         const Random random = [&](std::uint32_t limit) {
             return static_cast<std::uint32_t>(numbers() % limit);
         };
-        Bytes bytes(2048);
+        Bytes bytes(6144);
         for (auto& byte : bytes)
             byte = static_cast<std::uint8_t>(random(4) == 0 ? random(2) * 255 : random(256));
         job(*ops, bytes.data() + 1, random);
@@ -84,7 +84,7 @@ void expectSameOnAllTables(unsigned seed, auto&& job) {
 }
 
 TEST(RowOps, EveryInstructionSetGivesTheSameBytes) {
-    constexpr std::ptrdiff_t from = 1025;
+    constexpr std::ptrdiff_t from = 3001;
     for (unsigned seed = 0; seed < 71 * 10; ++seed) {
         const std::size_t count = seed % 71;
         const bool flag = seed & 1;
@@ -127,7 +127,8 @@ TEST(RowOps, EveryInstructionSetGivesTheSameBytes) {
                 const std::uint32_t step =
                     whole ? 0x20000U << random(3) : 0x10001 + random(flag ? 0x40000 : 0x400000);
                 const std::uint32_t start = random(8) << 16 | (whole ? 0 : random(0x10000));
-                return ops.sampleBox(to, source, {start, step, sourceCount}, count);
+                const std::size_t rows = 1 + random(RowOps::mostBoxRows);
+                return ops.sampleBox({to, 311}, {source, 353}, rows, {start, step, sourceCount}, count);
             }
             default: {
                 const std::uint32_t step =

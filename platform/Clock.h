@@ -4,7 +4,7 @@
 
 namespace platform {
 
-/// The time, handed in so that tests can tell it.
+/// The time, handed in so that tests can tell it. Any thread.
 class Clock {
 public:
     using Instant = std::chrono::steady_clock::time_point;

@@ -3,7 +3,8 @@
 #include <chrono>
 #include <unordered_map>
 
-/// Keeps a peer that sends rubbish from filling the log: ten entries a minute for each process.
+/// Keeps a peer that sends rubbish from filling the log: ten entries a minute for each process. For one
+/// thread at a time.
 class LogLimit {
 public:
     using Instant = std::chrono::steady_clock::time_point;

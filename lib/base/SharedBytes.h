@@ -7,7 +7,7 @@
 #include <utility>
 
 /// A run of immutable bytes and what keeps it alive: a buffer, a mapping, or nothing for static storage.
-/// Copying shares. Two compare equal when their bytes do.
+/// Copying shares; any thread may read. Two compare equal when their bytes do.
 class SharedBytes {
 public:
     SharedBytes() = default;

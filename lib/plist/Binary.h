@@ -8,7 +8,7 @@
 #include <string>
 #include <vector>
 
-/// The binary property-list format, "bplist00".
+/// The binary property-list format, "bplist00". Pure functions, for any thread.
 namespace plist {
 
 /// Deeper nesting is never read nor written, whatever the limits say.

@@ -4,7 +4,7 @@
 
 #include <string>
 
-/// The XML form of property lists, for files that people edit.
+/// The XML form of property lists, for files that people edit. A pure function, for any thread.
 namespace plist {
 
 /// The value, or nil and why, with the line, in `error`. A document that declares or uses entities of its own

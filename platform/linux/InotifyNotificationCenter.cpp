@@ -2,11 +2,13 @@
 
 #include "lib/base/Log.h"
 #include "platform/MainLoop.h"
+#include "platform/linux/PortLeftovers.h"
 #include "platform/linux/PrivateDirectory.h"
 
 #include <array>
 #include <cerrno>
 #include <cstring>
+#include <ctime>
 #include <fcntl.h>
 #include <functional>
 #include <memory>
@@ -26,6 +28,18 @@ struct Notices {
     std::vector<std::string> names; ///< equal neighbours merged
     bool areLost = false;
 };
+
+/// Files of those who ended while they posted: nobody else takes so long to rename one.
+void RemoveAbandoned(int directory) {
+    constexpr std::time_t longest = 60;
+    for (const auto& name : EntriesOf(directory)) {
+        struct stat status = {};
+        const bool isFile =
+            fstatat(directory, name.c_str(), &status, AT_SYMLINK_NOFOLLOW) == 0 && S_ISREG(status.st_mode);
+        if (isFile && name.starts_with('.') && std::time(nullptr) - status.st_mtim.tv_sec > longest)
+            unlinkat(directory, name.c_str(), 0);
+    }
+}
 
 Notices ReadNotices(int inotify) {
     Notices notices;
@@ -51,6 +65,7 @@ InotifyNotificationCenter::InotifyNotificationCenter(MainLoop& mainLoop, const s
     const auto parent = OpenPrivateDirectory(AT_FDCWD, directory);
     if (parent) m_notices = OpenPrivateDirectory(parent.get(), "notices");
     if (!m_notices) return;
+    RemoveAbandoned(m_notices.get());
     m_inotify.reset(inotify_init1(IN_CLOEXEC | IN_NONBLOCK));
     const auto path = PathInDirectory(m_notices.get(), ".");
     if (!m_inotify || inotify_add_watch(m_inotify.get(), path.c_str(), IN_MOVED_TO | IN_ONLYDIR) < 0) {

@@ -75,6 +75,18 @@ TEST_F(UnixPorts, refuseNamesThatAreNoFileOfTheirs) {
     EXPECT_FALSE(server.open(std::string(81, 'n')));
 }
 
+TEST_F(UnixPorts, haveNoNoticesThatSomebodyStartedToPostLongAgo) {
+    const std::filesystem::path notices = directory + "/notices";
+    for (const char* file : {".1.1", ".2.1", "posted"}) {
+        std::ofstream(notices / file);
+        if (file != std::string(".2.1"))
+            last_write_time(notices / file, std::filesystem::file_time_type::clock::now() - 2min);
+    }
+    const InotifyNotificationCenter later(loop, directory);
+    EXPECT_FALSE(exists(notices / ".1.1"));
+    EXPECT_TRUE(exists(notices / ".2.1") && exists(notices / "posted"));
+}
+
 TEST_F(UnixPorts, giveANameToTheNextOwnerWhenTheLastWasKilled) {
     const Child owner([&] { std::ignore = server.open(name).release(); });
     EXPECT_FALSE(server.open(name));

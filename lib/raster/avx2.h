@@ -36,14 +36,6 @@ KX_AVX2_INLINE void storePixels(std::uint8_t* to, Vector pixels, std::int64_t le
         _mm256_maskstore_epi32(reinterpret_cast<int*>(to), firstLanes(left), pixels);
 }
 
-/// The channels as words: of pixels 0 and 1, and of pixels 2 and 3, of each half.
-KX_AVX2_INLINE Vector lowWords(Vector pixels) {
-    return _mm256_unpacklo_epi8(pixels, _mm256_setzero_si256());
-}
-KX_AVX2_INLINE Vector highWords(Vector pixels) {
-    return _mm256_unpackhi_epi8(pixels, _mm256_setzero_si256());
-}
-
 KX_AVX2_INLINE void fill(std::uint8_t* to, std::uint32_t word, std::int64_t count) {
     const Vector pixels = _mm256_set1_epi32(static_cast<int>(word));
     for (; count >= lanes; count -= lanes, to += vectorBytes)

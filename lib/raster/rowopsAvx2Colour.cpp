@@ -18,42 +18,49 @@ KX_AVX2_INLINE Vector shuffleOf(const RasterChannelMap& map) {
                                                    0x08080808, 0x04040404, 0));
 }
 
+/// The channels as words: those at even places, and those at odd ones.
+KX_AVX2_INLINE Vector evenWords(Vector pixels) {
+    return _mm256_and_si256(pixels, _mm256_set1_epi16(0xFF));
+}
+KX_AVX2_INLINE Vector oddWords(Vector pixels) {
+    return _mm256_srli_epi16(pixels, 8);
+}
+KX_AVX2_INLINE Vector fromWords(Vector even, Vector odd) {
+    return _mm256_or_si256(even, _mm256_slli_epi16(odd, 8));
+}
+/// A pixel's alpha as a word beside its even channels, and beside its odd ones.
+KX_AVX2_INLINE Vector alphaWords(int alphaByte) {
+    const auto alpha = static_cast<std::uint8_t>(alphaByte);
+    return _mm256_or_si256(shuffleOf({alpha, 0, alpha, 0}), _mm256_set1_epi16(static_cast<short>(0x8000)));
+}
+
 /// (x + 127) / 255 for products of two bytes, exactly.
 KX_AVX2_INLINE Vector dividedBy255(Vector products) {
     return _mm256_mulhi_epu16(_mm256_add_epi16(products, _mm256_set1_epi16(128)), _mm256_set1_epi16(257));
 }
-
-/// A pixel's alpha, as words, beside each of its channels: of pixels 0 and 1 and of pixels 2 and 3 of a lane.
-struct AlphaWords {
-    Vector low;
-    Vector high;
-    KX_AVX2 explicit AlphaWords(int alphaByte) {
-        const long long unused = static_cast<long long>(0x8000800080008000ULL);
-        const auto pixel = [](int byte) { return byte * 0x0001000100010001LL; };
-        low = _mm256_set_epi64x(unused | pixel(4 + alphaByte), unused | pixel(alphaByte),
-                                unused | pixel(4 + alphaByte), unused | pixel(alphaByte));
-        high = _mm256_add_epi8(low, _mm256_set1_epi16(8));
-    }
-    KX_AVX2 Vector lowOf(Vector pixels) const { return _mm256_shuffle_epi8(pixels, low); }
-    KX_AVX2 Vector highOf(Vector pixels) const { return _mm256_shuffle_epi8(pixels, high); }
-};
+/// 255 less that.
+KX_AVX2_INLINE Vector restOf255(Vector products) {
+    return _mm256_mulhi_epu16(
+        _mm256_sub_epi16(_mm256_set1_epi16(static_cast<short>(255 * 255 + 128)), products),
+        _mm256_set1_epi16(257));
+}
 
 KX_AVX2_INLINE Vector alphaBytes(int alphaByte) {
     return _mm256_set1_epi32(static_cast<int>(0xFFU << (alphaByte * 8)));
 }
 
 struct Premultiplication {
-    AlphaWords alpha;
+    Vector alphas;
     Vector alphaMask;
     KX_AVX2 explicit Premultiplication(int alphaByte)
-        : alpha(alphaByte)
+        : alphas(alphaWords(alphaByte))
         , alphaMask(alphaBytes(alphaByte)) {}
-    KX_AVX2 Vector operator()(Vector pixels) const {
+    KX_AVX2_INLINE Vector operator()(Vector pixels) const {
         // With 255 for alpha itself, its product with alpha is what it was.
         const Vector factors = _mm256_or_si256(pixels, alphaMask);
-        const Vector low = dividedBy255(_mm256_mullo_epi16(lowWords(factors), alpha.lowOf(pixels)));
-        const Vector high = dividedBy255(_mm256_mullo_epi16(highWords(factors), alpha.highOf(pixels)));
-        return _mm256_packus_epi16(low, high);
+        const Vector alpha = _mm256_shuffle_epi8(pixels, alphas);
+        return fromWords(dividedBy255(_mm256_mullo_epi16(evenWords(factors), alpha)),
+                         dividedBy255(_mm256_mullo_epi16(oddWords(factors), alpha)));
     }
 };
 
@@ -142,12 +149,12 @@ KX_AVX2 void permuteShortRows(const RasterBlock& block, const std::uint8_t* from
 
 /// Pixels that are all opaque stay as they are, and those that are all clear become 0: most of an icon.
 template <typename Operation>
-KX_AVX2_INLINE void mapPixels(std::uint8_t* to, std::int64_t left, Vector alphaMask,
+KX_AVX2_INLINE void mapPixels(std::uint8_t* to, std::int64_t left, int alphaByte, Vector alphaMask,
                               const Operation& operation) {
     const Vector pixels = loadPixels(to, left);
     if (_mm256_testnzc_si256(pixels, alphaMask))
         storePixels(to, operation(pixels), left);
-    else if (!_mm256_testc_si256(pixels, alphaMask))
+    else if (to[alphaByte] == 0)
         storePixels(to, _mm256_setzero_si256(), left);
 }
 
@@ -155,54 +162,67 @@ template <typename Operation>
 KX_AVX2_INLINE void mapRow(std::uint8_t* to, std::size_t count, int alphaByte, const Operation& operation) {
     const Vector alphaMask = alphaBytes(alphaByte);
     auto left = static_cast<std::int64_t>(count);
-    for (; left >= lanes; left -= lanes, to += vectorBytes)
-        mapPixels(to, lanes, alphaMask, operation);
-    if (left > 0) mapPixels(to, left, alphaMask, operation);
+    for (; left >= 2 * lanes; left -= 2 * lanes, to += 2 * vectorBytes) {
+        mapPixels(to, lanes, alphaByte, alphaMask, operation);
+        mapPixels(to + vectorBytes, lanes, alphaByte, alphaMask, operation);
+    }
+    for (; left > 0; left -= lanes, to += vectorBytes)
+        mapPixels(to, left, alphaByte, alphaMask, operation);
 }
 
-/// Badge pixels already stand in the target's layout.
+/// Where a target's even and odd channels stand in the badge, and its alpha for both, as words. Alpha is none
+/// of the channels.
+struct BadgeWords {
+    Vector even;
+    Vector odd;
+    Vector alphas;
+    KX_AVX2 BadgeWords(bool toAlphaFirst, bool alphaFirst) {
+        const std::uint8_t first = alphaFirst ? 1 : 0;
+        const auto second = static_cast<std::uint8_t>(first + 1);
+        const auto third = static_cast<std::uint8_t>(first + 2);
+        even = toAlphaFirst ? wordsAt(none, second) : wordsAt(first, third);
+        odd = toAlphaFirst ? wordsAt(first, third) : wordsAt(second, none);
+        const std::uint8_t alpha = alphaFirst ? 0 : 3;
+        alphas = wordsAt(alpha, alpha);
+    }
+
+private:
+    static constexpr std::uint8_t none = 0x80;
+    KX_AVX2 static Vector wordsAt(std::uint8_t a, std::uint8_t b) { return shuffleOf({a, none, b, none}); }
+};
+
+/// What a badge leaves of the target's channels: of 255, all but round((255 - s) * a / 255) for straight
+/// colours s, all but a - m for premultiplied ones m.
 template <bool Premultiplied>
 struct Multiplication {
-    AlphaWords alpha;
-    Vector alphaMask;
-    KX_AVX2 explicit Multiplication(int alphaByte)
-        : alpha(alphaByte)
-        , alphaMask(alphaBytes(alphaByte)) {}
+    BadgeWords words;
 
-    KX_AVX2 static Vector darkness(Vector words, Vector alphas) {
-        if constexpr (Premultiplied)
-            return _mm256_subs_epu16(alphas, words);
-        else
-            return dividedBy255(_mm256_mullo_epi16(words, alphas));
+    KX_AVX2_INLINE static Vector light(Vector dark, Vector alpha) {
+        if constexpr (Premultiplied) {
+            const Vector all = _mm256_set1_epi16(255);
+            const Vector clear = _mm256_sub_epi16(all, alpha);
+            return _mm256_sub_epi16(all, _mm256_subs_epu16(dark, clear));
+        } else {
+            return restOf255(_mm256_mullo_epi16(dark, alpha));
+        }
     }
-    KX_AVX2 Vector operator()(Vector target, Vector badge) const {
-        // Straight colours: alpha - round(s * a / 255) is round((255 - s) * a / 255). Alpha's own byte comes
-        // to 0.
-        const Vector factors =
-            Premultiplied ? badge
-                          : _mm256_andnot_si256(badge, _mm256_xor_si256(alphaMask, _mm256_set1_epi8(-1)));
-        const Vector low = darkness(lowWords(factors), alpha.lowOf(badge));
-        const Vector high = darkness(highWords(factors), alpha.highOf(badge));
-        const Vector less = _mm256_packus_epi16(dividedBy255(_mm256_mullo_epi16(lowWords(target), low)),
-                                                dividedBy255(_mm256_mullo_epi16(highWords(target), high)));
-        return _mm256_sub_epi8(target, less);
+    KX_AVX2_INLINE Vector operator()(Vector target, Vector badge) const {
+        const Vector dark = _mm256_xor_si256(badge, _mm256_set1_epi8(-1));
+        const Vector alpha = _mm256_shuffle_epi8(badge, words.alphas);
+        const Vector even = light(_mm256_shuffle_epi8(dark, words.even), alpha);
+        const Vector odd = light(_mm256_shuffle_epi8(dark, words.odd), alpha);
+        // t - round(t * d / 255) is round(t * (255 - d) / 255).
+        return fromWords(dividedBy255(_mm256_mullo_epi16(evenWords(target), even)),
+                         dividedBy255(_mm256_mullo_epi16(oddWords(target), odd)));
     }
 };
 
 template <bool Premultiplied>
-KX_AVX2 void multiplyRow(std::uint8_t* to, RasterLayout toLayout, const std::uint8_t* from, bool alphaFirst,
-                         std::size_t count) {
-    constexpr RasterChannelMap same{0, 1, 2, 3};
-    const RasterChannelMap& map = toLayout.alphaFirst == alphaFirst ? same
-                                  : toLayout.alphaFirst             ? rasterRGBAToARGB
-                                                                    : rasterARGBToRGBA;
-    const Vector shuffle = shuffleOf(map);
-    const Multiplication<Premultiplied> times(toLayout.alphaFirst ? 0 : 3);
-    for (auto left = static_cast<std::int64_t>(count); left > 0;
-         left -= lanes, to += vectorBytes, from += vectorBytes) {
-        const Vector badge = _mm256_shuffle_epi8(loadPixels(from, left), shuffle);
-        storePixels(to, times(loadPixels(to, left), badge), left);
-    }
+KX_AVX2 void multiplyRow(std::uint8_t* to, const std::uint8_t* from,
+                         const Multiplication<Premultiplied>& times, std::int64_t left) {
+    for (; left >= lanes; left -= lanes, to += vectorBytes, from += vectorBytes)
+        storePixels(to, times(loadPixels(to, lanes), loadPixels(from, lanes)), lanes);
+    if (left > 0) storePixels(to, times(loadPixels(to, left), loadPixels(from, left)), left);
 }
 
 } // namespace
@@ -232,8 +252,12 @@ KX_AVX2 void unpremultiply(std::uint8_t* pixels, std::size_t count, int alphaByt
 
 KX_AVX2 void multiply(std::uint8_t* to, RasterLayout toLayout, const std::uint8_t* from,
                       RasterLayout fromLayout, std::size_t count) {
-    const auto row = fromLayout.premultiplied ? multiplyRow<true> : multiplyRow<false>;
-    row(to, toLayout, from, fromLayout.alphaFirst, count);
+    const BadgeWords words(toLayout.alphaFirst, fromLayout.alphaFirst);
+    const auto left = static_cast<std::int64_t>(count);
+    if (fromLayout.premultiplied)
+        multiplyRow(to, from, Multiplication<true>{words}, left);
+    else
+        multiplyRow(to, from, Multiplication<false>{words}, left);
 }
 
 } // namespace raster::avx2

@@ -26,11 +26,13 @@ public:
     }
     KX_AVX2_INLINE Vector operator()(Vector sums) const {
         const Vector value = _mm256_slli_epi16(sums, 3);
-        const Vector below = _mm256_mulhi_epu16(value, m_low);
+        // With its sign flipped, as the comparison takes it: an unsigned sum below what was added has
+        // carried.
+        const Vector below =
+            _mm256_xor_si256(_mm256_mulhi_epu16(value, m_low), _mm256_set1_epi16(static_cast<short>(0x8000)));
         const Vector middle = _mm256_add_epi16(_mm256_mullo_epi16(value, m_high), below);
-        const Vector noCarry = _mm256_cmpeq_epi16(_mm256_max_epu16(middle, below), middle);
-        const Vector withCarry = _mm256_sub_epi16(_mm256_mulhi_epu16(value, m_high), _mm256_set1_epi16(-1));
-        return _mm256_srl_epi16(_mm256_add_epi16(withCarry, noCarry), m_shift);
+        const Vector above = _mm256_mulhi_epu16(value, m_high);
+        return _mm256_srl_epi16(_mm256_sub_epi16(above, _mm256_cmpgt_epi16(below, middle)), m_shift);
     }
 
 private:
@@ -154,11 +156,12 @@ public:
             m_together /= 2;
     }
     KX_AVX2 void sample(RasterRows<std::uint8_t> to, std::int64_t count) {
+        Vector boxes[lanes] = {};
         for (std::int64_t x = 0; x < count; x += lanes) {
-            Vector boxes[lanes];
-            for (std::int64_t i = 0; i < lanes; i += m_together)
-                // Beyond the last box, others that nobody sees.
-                averageBoxes(boxes + i, m_sampling.position + std::min(x + i, count - 1) * m_sampling.step);
+            const std::int64_t end = std::min(count - x, lanes);
+            for (std::int64_t i = 0; i < end; i += m_together)
+                averageBoxes(boxes + i, m_sampling.position + (x + i) * m_sampling.step,
+                             std::min(end - i, m_together));
             transpose(boxes);
 #pragma GCC unroll 8
             for (int i = 0; i < lanes; ++i)
@@ -167,13 +170,12 @@ public:
     }
 
 private:
-    /// As many boxes as are worked on together.
-    KX_AVX2_INLINE void averageBoxes(Vector* boxes, std::int64_t position) {
+    KX_AVX2_INLINE void averageBoxes(Vector* boxes, std::int64_t position, std::int64_t count) {
         // Not the members, which the compiler would load anew for each box.
         const Average average = m_average;
         const BoxShape shape = m_shape;
         const std::int64_t first = position >> 16;
-        const std::int64_t last = position + (m_together - 1) * shape.step;
+        const std::int64_t last = position + (count - 1) * shape.step;
         readColumns(first, (last >> 16) + shape.pixels());
         for (; position <= last; position += shape.step)
             *boxes++ = boxSums(m_columns + ((position >> 16) - first), position, shape).averaged(average);

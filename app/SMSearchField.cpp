@@ -7,6 +7,7 @@
 
 #include <QAction>
 #include <QCoreApplication>
+#include <QInputMethodEvent>
 #include <QKeyEvent>
 #include <QPainter>
 #include <QStyle>
@@ -80,8 +81,14 @@ void SMSearchField::setStringValue(const std::string& value) {
     m_isSetFromCode = false;
 }
 
+void SMSearchField::inputMethodEvent(QInputMethodEvent* event) {
+    m_isComposing = !event->preeditString().isEmpty();
+    update(); // the toolkit does so for the text alone
+    QLineEdit::inputMethodEvent(event);
+}
+
 void SMSearchField::paintEvent(QPaintEvent* event) {
-    const bool isEmpty = displayText().isEmpty();
+    const bool isEmpty = displayText().isEmpty() && !m_isComposing;
     if (isEmpty != m_isDrawnEmpty) {
         m_isDrawnEmpty = isEmpty;
         m_picture.invalidate();

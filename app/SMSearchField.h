@@ -27,6 +27,7 @@ public:
 
 protected:
     bool event(QEvent* event) override;
+    void inputMethodEvent(QInputMethodEvent* event) override;
     void paintEvent(QPaintEvent* event) override;
 
 private:
@@ -34,6 +35,7 @@ private:
 
     MenuPicture m_picture;
     bool m_isDrawnEmpty = true;
+    bool m_isComposing = false; ///< an input method's letters stand there, which are not text yet
     QString m_placeholder;
     CommandHandler m_commandHandler;
     std::function<void()> m_textHandler;

@@ -13,8 +13,9 @@ namespace platform {
 /// What happens to a panel. Main thread.
 class PanelDelegate {
 public:
-    /// The panel lost the keyboard, or a button was pressed outside of all windows of this process. One event
-    /// may cause several calls, also after the panel was ordered out.
+    /// The panel lost the keyboard, or a button was pressed outside of all windows of this process, and of
+    /// those that came up above it unmanaged, as an input method's. One event may cause several calls, also
+    /// after the panel was ordered out.
     virtual void panelDidResignKey() = 0;
     /// Option was pressed or let go while the panel had the keyboard, after the panel itself has handled it;
     /// also at every opening, as it then is.

@@ -165,7 +165,7 @@ private:
     }
 
     bool isOutside(QPoint point) const {
-        if (QtRectFromScreen(m_ownArea()).contains(point)) return false;
+        if (XcbIsPointerAbove(nativeWindow()) || QtRectFromScreen(m_ownArea()).contains(point)) return false;
         const auto windows = QGuiApplication::topLevelWindows();
         return std::none_of(windows.begin(), windows.end(), [point](const QWindow* window) {
             return window->isVisible() && window->geometry().contains(point);

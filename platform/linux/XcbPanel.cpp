@@ -110,6 +110,27 @@ bool XcbIsWithin(std::uint32_t window, std::uint32_t outer) {
     return window == outer && window != XCB_WINDOW_NONE;
 }
 
+bool XcbIsPointerAbove(std::uint32_t window) {
+    auto* c = XcbConnection();
+    if (!c) return false;
+    const auto pointerCookie = xcb_query_pointer(c, XcbRootWindow(c));
+    const auto treeCookie = xcb_query_tree(c, XcbRootWindow(c));
+    const XcbReply<xcb_query_pointer_reply_t> pointer(xcb_query_pointer_reply(c, pointerCookie, nullptr));
+    const XcbReply<xcb_query_tree_reply_t> tree(xcb_query_tree_reply(c, treeCookie, nullptr));
+    if (!pointer || !tree) return false;
+    const xcb_window_t* first = xcb_query_tree_children(tree.get());
+    const xcb_window_t* end = first + tree->children_len;
+    const auto* below = std::find(first, end, window);
+    if (std::find(below, end, pointer->child) == end) return false;
+    // The window manager's frames are not managed either; they are of its connection.
+    const auto connection = ~xcb_get_setup(c)->resource_id_mask;
+    const auto manager = XcbWindowNamedByRoot("_NET_SUPPORTING_WM_CHECK");
+    const XcbReply<xcb_get_window_attributes_reply_t> attributes(
+        xcb_get_window_attributes_reply(c, xcb_get_window_attributes(c, pointer->child), nullptr));
+    return attributes && attributes->override_redirect &&
+           (pointer->child & connection) != (manager & connection);
+}
+
 void XcbSetInputFocus(std::uint32_t window, std::uint32_t time) {
     auto* c = XcbConnection();
     if (!c) return;

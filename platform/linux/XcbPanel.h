@@ -28,6 +28,9 @@ std::uint32_t XcbInputFocus();
 bool XcbHasInputFocus();
 /// Whether the first window is the second, or lies somewhere in it.
 bool XcbIsWithin(std::uint32_t window, std::uint32_t outer);
+/// Whether the pointer is on a window that came up above the given one without the window manager, as menus
+/// and an input method's candidates do.
+bool XcbIsPointerAbove(std::uint32_t window);
 /// Gives the window the keyboard, if it can be seen, and if nobody was given it after that time of the
 /// server's.
 void XcbSetInputFocus(std::uint32_t window, std::uint32_t time);

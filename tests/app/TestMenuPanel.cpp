@@ -138,6 +138,18 @@ TEST_F(MenuPanel, PaintsOnlyRowsInViewAndMakesNothingAnewForTheSamePicture) {
     EXPECT_EQ(box->tools().madeAnew(), made);
 }
 
+TEST(SMSearchField, ShowsWhatIsBeingComposedInPlaceOfItsPlaceholder) {
+    SMSearchField field;
+    QInputMethodEvent composed("c", {});
+    QCoreApplication::sendEvent(&field, &composed);
+    const QImage bare = field.grab().toImage();
+    field.setPlaceholderText("Search");
+    EXPECT_EQ(field.grab().toImage(), bare);
+    QInputMethodEvent given("", {});
+    QCoreApplication::sendEvent(&field, &given);
+    EXPECT_NE(field.grab().toImage(), bare);
+}
+
 TEST_F(MenuPanel, TellsOfAMachineAndGoesHomeOnlyWhenTheUserChoosesIt) {
     auto* machines = widget<QComboBox>("vmListPopUpButton");
     owner.contents.selectedIndex = 7;

@@ -185,6 +185,19 @@ class Panel(unittest.TestCase):
             if then:
                 self.keeps_keyboard(then)
 
+    def test_stays_open_when_a_window_of_an_input_method_is_clicked(self):
+        window = self.start(*self.watcher("candidates", (60, 60)))
+        self.addCleanup(window.wait)
+        self.addCleanup(window.kill)
+        candidates = wait_until("a window", Window("candidates").id)
+        run("xdotool", "windowunmap", "--sync", candidates, "set_window", "--overrideredirect", "1", candidates)
+        self.activate("one")
+        self.show()
+        run("xdotool", "windowmap", "--sync", candidates, "windowraise", candidates)
+        x, y, _, _ = Window("candidates").frame()
+        click(x + 20, y + 20)
+        self.assertIn("Calculator", self.chooses(*LETTERS))
+
     def test_stands_above_docks_on_every_workspace_and_in_no_list(self):
         run("xdotool", "set_num_desktops", "2")
         self.addCleanup(run, "xdotool", "set_desktop", "0")

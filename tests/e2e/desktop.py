@@ -2,7 +2,9 @@
 
 import os
 import re
+import shutil
 import subprocess
+import tempfile
 import time
 
 
@@ -85,6 +87,48 @@ class Picture:
         return runs
 
 
+class Home:
+    """A home directory of the test's own, the user's for every program started from now on, and files in it."""
+
+    def __init__(self):
+        self.name = tempfile.mkdtemp()
+        os.environ.update(HOME=self.name, XDG_DATA_HOME=self.name + "/data", XDG_CONFIG_HOME=self.name + "/config")
+
+    def cleanup(self):
+        shutil.rmtree(self.name, ignore_errors=True)
+
+    def write(self, name, text):
+        """Answers the path."""
+        path = os.path.join(self.name, name)
+        os.makedirs(os.path.dirname(path), exist_ok=True)
+        with open(path, "w", encoding="utf-8") as file:
+            file.write(text)
+        return path
+
+    def write_entry(self, name, title, command="true"):
+        self.write(f"data/applications/{name}.desktop",
+                   f"[Desktop Entry]\nType=Application\nName={title}\nExec={command}\n")
+
+    def read(self, name):
+        """Empty while there is no such file."""
+        try:
+            with open(os.path.join(self.name, name), encoding="utf-8", errors="replace") as file:
+                return file.read()
+        except FileNotFoundError:
+            return ""
+
+
+def start(*command, output=os.devnull):
+    """Another program; whoever starts it ends it."""
+    with open(output, "w", encoding="utf-8") as file:
+        return subprocess.Popen(command, stdout=file, stderr=subprocess.DEVNULL)
+
+
+def end(process):
+    process.kill()
+    process.wait()
+
+
 class Program:
     """A program of the build under test. Ends with the test."""
 
@@ -95,8 +139,7 @@ class Program:
         Program.running.append(self)
 
     def kill(self):
-        self.process.kill()
-        self.process.wait()
+        end(self.process)
 
     @classmethod
     def end_all(cls):

@@ -8,10 +8,9 @@ import os
 import re
 import subprocess
 import sys
-import tempfile
 import unittest
 
-from desktop import Picture, Program, Window, click, point, press, run, type_text, wait_until
+from desktop import Home, Picture, Program, Window, click, point, press, run, type_text, wait_until
 
 STATUS_ITEM = Window("Tessel status item")
 PANEL = Window("Tessel start menu")
@@ -22,9 +21,7 @@ LIST_TOP = 84  # and below this the list, under "All Programs" or "Back"
 class FirstLight(unittest.TestCase):
     @classmethod
     def setUpClass(cls):
-        cls.home = tempfile.TemporaryDirectory()
-        os.environ.update(HOME=cls.home.name, XDG_DATA_HOME=cls.home.name + "/data",
-                          XDG_CONFIG_HOME=cls.home.name + "/config")
+        cls.home = Home()
         cls.record = os.path.join(cls.home.name, "record")
         cls.start_daemon()
         wait_until("the status item", STATUS_ITEM.is_open)
@@ -43,16 +40,11 @@ class FirstLight(unittest.TestCase):
 
     @classmethod
     def log_of(cls, program):
-        try:
-            with open(f"{cls.home.name}/Library/Logs/Corvane Tessel/{program}.log", encoding="utf-8") as file:
-                return file.read()
-        except FileNotFoundError:
-            return ""
+        return cls.home.read(f"Library/Logs/Corvane Tessel/{program}.log")
 
     @classmethod
     def recorded(cls, start):
-        with open(cls.record, encoding="utf-8") as file:
-            return [line for line in file.read().splitlines() if line.startswith(start)]
+        return [line for line in cls.home.read("record").splitlines() if line.startswith(start)]
 
     @classmethod
     def wait_for_update(cls, more_than=0):

@@ -6,10 +6,9 @@ Started by tools/with-display, with KX_TEST_BIN naming the programs' folder."""
 import os
 import re
 import subprocess
-import tempfile
 import unittest
 
-from desktop import Picture, Program, Window, click, point, press, run, type_text, wait_until
+from desktop import Home, Picture, Program, Window, click, point, press, run, type_text, wait_until
 from peer import Peer, process_number
 
 STATUS_ITEM = Window("Tessel status item")
@@ -21,25 +20,15 @@ ACTION_BUTTON = 62  # its height in the panel: "All Programs" or "Back"
 class MenuByHand(unittest.TestCase):
     @classmethod
     def setUpClass(cls):
-        cls.home = tempfile.TemporaryDirectory()
-        os.environ.update(HOME=cls.home.name, XDG_DATA_HOME=cls.home.name + "/data",
-                          XDG_CONFIG_HOME=cls.home.name + "/config")
-        cls.record = os.path.join(cls.home.name, "record")
-        cls.install([f"Program {i:02}" for i in range(40)] + ["Calculator"])
-        daemon = Program("tesselDaemon", "--record", cls.record, "--machine", "host")
+        cls.home = Home()
+        for title in [f"Program {i:02}" for i in range(40)] + ["Calculator"]:
+            cls.home.write_entry(title.replace(" ", ""), title)
+        daemon = Program("tesselDaemon", "--record", cls.home.name + "/record", "--machine", "host")
         wait_until("the status item", STATUS_ITEM.is_open)
         cls.wait_for("^menu.update sent")
         cls.peer = Peer(os.path.join(os.environ["XDG_RUNTIME_DIR"], "com.corvane.kxipc"))
         agent, = run("pgrep", "--parent", str(daemon.process.pid), "corvane-tessel").split()
         cls.agent_port = Peer.port_of(process_number(int(agent)))
-
-    @classmethod
-    def install(cls, titles):
-        folder = os.path.join(cls.home.name, "data", "applications")
-        os.makedirs(folder)
-        for title in titles:
-            with open(os.path.join(folder, title.replace(" ", "") + ".desktop"), "w", encoding="utf-8") as file:
-                file.write(f"[Desktop Entry]\nType=Application\nName={title}\nExec=true\n")
 
     @classmethod
     def tearDownClass(cls):
@@ -49,8 +38,7 @@ class MenuByHand(unittest.TestCase):
 
     @classmethod
     def recorded(cls):
-        with open(cls.record, encoding="utf-8") as file:
-            return file.read()
+        return cls.home.read("record")
 
     @classmethod
     def wait_for(cls, pattern, after=""):

@@ -4,10 +4,9 @@
 Started by tools/with-display, with KX_TEST_BIN naming the programs' folder."""
 
 import os
-import tempfile
 import unittest
 
-from desktop import Program, Window, click, press, run, type_text, wait_until
+from desktop import Home, Program, Window, click, press, run, type_text, wait_until
 
 STATUS_ITEM = Window("Tessel status item")
 PANEL = Window("Tessel start menu")
@@ -24,26 +23,20 @@ def split_screen(left, right):
 
 class MenuOnScreens(unittest.TestCase):
     def start(self, **environment):
-        home = tempfile.TemporaryDirectory()
-        self.addCleanup(home.cleanup)
-        applications = home.name + "/data/applications"
-        os.makedirs(applications)
-        for number in range(40):
-            with open(f"{applications}/program{number:02}.desktop", "w", encoding="utf-8") as file:
-                file.write(f"[Desktop Entry]\nType=Application\nName=Program {number:02}\nExec=true\n")
         before = dict(os.environ)
-        os.environ.update(HOME=home.name, XDG_DATA_HOME=home.name + "/data", XDG_CONFIG_HOME=home.name + "/config",
-                          **environment)
+        self.home = Home()
+        self.addCleanup(self.home.cleanup)
+        for number in range(40):
+            self.home.write_entry(f"program{number:02}", f"Program {number:02}")
+        os.environ.update(environment)
         self.addCleanup(lambda: (os.environ.clear(), os.environ.update(before)))
-        self.record = home.name + "/record"
-        Program("tesselDaemon", "--record", self.record, "--machine", "host")
+        Program("tesselDaemon", "--record", self.home.name + "/record", "--machine", "host")
         self.addCleanup(Program.end_all)
         wait_until("the status item", STATUS_ITEM.is_open)
         wait_until("an update", lambda: "menu.update sent" in self.recorded())
 
     def recorded(self):
-        with open(self.record, encoding="utf-8") as file:
-            return file.read()
+        return self.home.read("record")
 
     def open_menu(self):
         x, y, width, height = STATUS_ITEM.frame()

@@ -9,11 +9,10 @@ import re
 import signal
 import subprocess
 import sys
-import tempfile
 import threading
 import unittest
 
-from desktop import Picture, Program, Window, click, press, run, wait_until
+from desktop import Home, Picture, Program, Window, click, end, press, run, start, wait_until
 
 ITEM = Window("Tessel status item")
 PANEL = Window("Tessel start menu")
@@ -43,43 +42,18 @@ def words_of_root(key):
 class Panel(unittest.TestCase):
     @classmethod
     def setUpClass(cls):
-        cls.home = tempfile.TemporaryDirectory()
-        os.environ.update(HOME=cls.home.name, XDG_DATA_HOME=cls.home.name + "/data",
-                          XDG_CONFIG_HOME=cls.home.name + "/config")
-        cls.write_entry("Calculator", "true")
-        cls.write_entry("Opener", f"sh -c \"{' '.join(cls.watcher('opened', (740, 430)))} >{cls.home.name}/opened\"")
-        cls.processes = []
-        if sys.argv[1:]:
-            cls.start(*sys.argv[1:])
+        cls.home = Home()
+        cls.home.write_entry("calculator", "Calculator")
+        cls.home.write_entry("opener", "Opener", f"sh -c \"{' '.join(cls.watcher('opened', (740, 430)))} >{cls.home.name}/opened\"")
+        cls.processes = [start(*sys.argv[1:])] if sys.argv[1:] else []
         if BLURS:  # not by itself where the processor draws
             wait_until("blur", lambda: run(*LOAD_BLUR) and BLUR in run("xprop", "-root"))
         Program("tesselDaemon", "--record", cls.home.name + "/record", "--machine", "host")
         wait_until("the item", ITEM.is_open)
-        wait_until("an update", lambda: "menu.update sent" in cls.read("record"))
+        wait_until("an update", lambda: "menu.update sent" in cls.home.read("record"))
         for name, place in OTHERS.items():
-            cls.start(*cls.watcher(name, place), output=cls.write(name, ""))
+            cls.processes.append(start(*cls.watcher(name, place), output=cls.home.name + "/" + name))
             wait_until("another window", Window(name).is_open)
-
-    @classmethod
-    def write(cls, name, text):
-        path = os.path.join(cls.home.name, name)
-        os.makedirs(os.path.dirname(path), exist_ok=True)
-        with open(path, "w", encoding="utf-8") as file:
-            file.write(text)
-        return path
-
-    @classmethod
-    def write_entry(cls, name, command):
-        cls.write(f"data/applications/{name}.desktop",
-                  f"[Desktop Entry]\nType=Application\nName={name}\nExec={command}\n")
-
-    @classmethod
-    def read(cls, name):
-        try:
-            with open(os.path.join(cls.home.name, name), encoding="utf-8") as file:
-                return file.read()
-        except FileNotFoundError:
-            return ""
 
     @staticmethod
     def watcher(name, place):
@@ -87,29 +61,24 @@ class Panel(unittest.TestCase):
         return ["xev", "-name", name, "-geometry", "300x200+{}+{}".format(*place), "-event", "keyboard"]
 
     @classmethod
-    def start(cls, *command, output=os.devnull):
-        with open(output, "w", encoding="utf-8") as file:
-            process = subprocess.Popen(command, stdout=file, stderr=subprocess.DEVNULL)
-        cls.processes.append(process)
-        return process
-
-    @classmethod
     def tearDownClass(cls):
         Program.end_all()
         for process in reversed(cls.processes):
-            process.kill()
-            process.wait()
+            end(process)
         cls.home.cleanup()
 
     def setUp(self):
         self.activate("one")
+
+    def start(self, *command):
+        self.addCleanup(end, start(*command))
 
     def tearDown(self):
         subprocess.run([AGENT, "--hide"], check=True)
 
     @classmethod
     def typed(cls, name):
-        return "".join(re.findall(r"KeyPress[^K]*?keysym 0x[0-9a-f]+, (\w)\)", cls.read(name)))
+        return "".join(re.findall(r"KeyPress[^K]*?keysym 0x[0-9a-f]+, (\w)\)", cls.home.read(name)))
 
     def gets_keys(self, name):
         """Whether what is typed goes to that window."""
@@ -130,7 +99,7 @@ class Panel(unittest.TestCase):
         self.assertTrue(self.gets_keys(name), "and to keep it")
 
     def actions(self):
-        return self.read("record").count("menu.onAction received")
+        return self.home.read("record").count("menu.onAction received")
 
     def show(self):
         subprocess.run([AGENT, "--show"], check=True)
@@ -142,30 +111,30 @@ class Panel(unittest.TestCase):
         run("xdotool", *after, "key", "ctrl+a", *keys, "Return")  # the last search may still be there
         wait_until("the action", lambda: self.actions() > before)
         self.assertEqual(self.typed("one"), elsewhere)
-        return self.read("record").rsplit("menu.onAction received", 1)[1]
+        return self.home.read("record").rsplit("menu.onAction received", 1)[1]
 
     def test_typing_at_once_however_it_was_opened(self):
         x, y, width, height = ITEM.frame()
         agent = int(run("xdotool", "getwindowpid", ITEM.id()))
         for button in "1", "3", "1":
-            self.assertIn("Calculator", self.chooses(
+            self.assertIn("calculator", self.chooses(
                 *LETTERS, after=("mousemove", str(x + width // 2), str(y + height // 2), "click", button)))
             self.keeps_keyboard("one")
             self.show()
-            self.assertIn("Calculator", self.chooses(*LETTERS))
+            self.assertIn("calculator", self.chooses(*LETTERS))
             self.keeps_keyboard("one")
             # The agent is late: what is typed waits from the press on, for as long as the button is held.
             os.kill(agent, signal.SIGSTOP)
             run("xdotool", "mousedown", button)
             wait_until("the press", lambda: not self.gets_keys("one"))
             threading.Timer(1, os.kill, (agent, signal.SIGCONT)).start()
-            self.assertIn("Calculator", self.chooses(*LETTERS))
+            self.assertIn("calculator", self.chooses(*LETTERS))
             run("xdotool", "mouseup", button)
             self.keeps_keyboard("one")
 
     def test_a_program_that_it_opens_gets_the_keyboard(self):
         self.show()
-        self.assertIn("Opener", self.chooses(*"opener"))
+        self.assertIn("opener", self.chooses(*"opener"))
         opened = wait_until("its window", Window("opened").id)
         self.keeps_keyboard("opened")
         run("xdotool", "windowkill", opened)
@@ -186,9 +155,7 @@ class Panel(unittest.TestCase):
                 self.keeps_keyboard(then)
 
     def test_stays_open_when_a_window_of_an_input_method_is_clicked(self):
-        window = self.start(*self.watcher("candidates", (60, 60)))
-        self.addCleanup(window.wait)
-        self.addCleanup(window.kill)
+        self.start(*self.watcher("candidates", (60, 60)))
         candidates = wait_until("a window", Window("candidates").id)
         run("xdotool", "windowunmap", "--sync", candidates, "set_window", "--overrideredirect", "1", candidates)
         self.activate("one")
@@ -196,7 +163,7 @@ class Panel(unittest.TestCase):
         run("xdotool", "windowmap", "--sync", candidates, "windowraise", candidates)
         x, y, _, _ = Window("candidates").frame()
         click(x + 20, y + 20)
-        self.assertIn("Calculator", self.chooses(*LETTERS))
+        self.assertIn("calculator", self.chooses(*LETTERS))
 
     def test_stands_above_docks_on_every_workspace_and_in_no_list(self):
         run("xdotool", "set_num_desktops", "2")
@@ -205,9 +172,7 @@ class Panel(unittest.TestCase):
         x, y, width, height = PANEL.frame()
         for key in ("_NET_CLIENT_LIST", "_NET_CLIENT_LIST_STACKING"):
             self.assertNotIn(int(PANEL.id()), words_of_root(key))
-        dock = self.start("tint2", "-c", self.write("dock", TINT2))
-        self.addCleanup(dock.wait)
-        self.addCleanup(dock.kill)
+        self.start("tint2", "-c", self.home.write("dock", TINT2))
         # Docks come up above all windows, and stay so above those that a window manager manages.
         wait_until("the dock", lambda: Picture().pixel(1279 - 690, 60) == (255, 0, 0))
         wait_until("the panel above it", lambda: Picture().pixel(x + width - 30, 60) != (255, 0, 0))
@@ -231,11 +196,9 @@ class Panel(unittest.TestCase):
         click(1000, 600)  # the other screen
         wait_until("the panel to close", lambda: not PANEL.is_open())
 
-        tray = self.start("trayer", "--edge", "top", "--align", "left", "--monitor", "1", "--margin", "60",
-                          "--widthtype", "request", "--height", "40", "--SetDockType", "true")
         self.addCleanup(wait_until, "the strip", lambda: ITEM.frame() == STRIP_AT_LEFT)
-        self.addCleanup(tray.wait)
-        self.addCleanup(tray.kill)
+        self.start("trayer", "--edge", "top", "--align", "left", "--monitor", "1", "--margin", "60",
+                   "--widthtype", "request", "--height", "40", "--SetDockType", "true")
 
         def item_at_other():
             frame = ITEM.frame() or STRIP_AT_LEFT
@@ -244,7 +207,7 @@ class Panel(unittest.TestCase):
         click(x + 5, y + 5)
         wait_until("the panel", PANEL.is_open)
         self.assertEqual(PANEL.frame()[0], x - 1, "no room to the left: mirrored at the item")
-        self.assertIn("Calculator", self.chooses(*LETTERS))
+        self.assertIn("calculator", self.chooses(*LETTERS))
 
     def test_lies_over_a_blurred_picture_of_the_screen_without_itself(self):
         how = "by the compositor" if BLURS else "of a picture of the screen"
@@ -252,9 +215,7 @@ class Panel(unittest.TestCase):
         stripes = self.home.name + "/stripes.ppm"
         with open(stripes, "wb") as file:
             file.write(b"P6 1200 700 255\n" + (b"\xff\x80\x00" * 8 + b"\x00\x80\xff" * 8) * (75 * 700))
-        window = self.start("display", "-title", "stripes", "-geometry", "+60+0", stripes)
-        self.addCleanup(window.wait)
-        self.addCleanup(window.kill)
+        self.start("display", "-title", "stripes", "-geometry", "+60+0", stripes)
 
         def red(x, y, width):
             picture = Picture()

@@ -6,12 +6,10 @@ clicked, and the host is killed and started again while the menu is open."""
 
 import os
 import re
-import subprocess
-import tempfile
 import time
 import unittest
 
-from desktop import Picture, Program, Window, click, press, run, type_text, wait_until
+from desktop import Home, Picture, Program, Window, click, end, press, run, start, type_text, wait_until
 
 ITEM = Window("Tessel status item")
 PANEL = Window("Tessel start menu")
@@ -64,45 +62,22 @@ def inked(x, y, width, height):
 class StatusHosts(unittest.TestCase):
     @classmethod
     def setUpClass(cls):
-        cls.home = tempfile.TemporaryDirectory()
-        os.environ.update(HOME=cls.home.name, XDG_DATA_HOME=cls.home.name + "/data",
-                          XDG_CONFIG_HOME=cls.home.name + "/config")
-        cls.write("config/lxqt/panel.conf", LXQT)
-        cls.tint2rc = cls.write("tint2rc", TINT2)
-        cls.record = cls.home.name + "/record"
-        Program("tesselDaemon", "--record", cls.record, "--machine", "Sample guest")
+        cls.home = Home()
+        cls.home.write("config/lxqt/panel.conf", LXQT)
+        cls.tint2rc = cls.home.write("tint2rc", TINT2)
+        Program("tesselDaemon", "--record", cls.home.name + "/record", "--machine", "Sample guest")
         wait_until("the strip", item_is_in_strip)
-        wait_until("an update", lambda: "menu.update sent" in cls.read(cls.record))
+        wait_until("an update", lambda: "menu.update sent" in cls.home.read("record"))
 
     @classmethod
     def tearDownClass(cls):
         Program.end_all()
         cls.home.cleanup()
 
-    @classmethod
-    def write(cls, name, text):
-        path = os.path.join(cls.home.name, name)
-        os.makedirs(os.path.dirname(path), exist_ok=True)
-        with open(path, "w", encoding="utf-8") as file:
-            file.write(text)
-        return path
-
-    @staticmethod
-    def read(path):
-        try:
-            with open(path, encoding="utf-8", errors="replace") as file:
-                return file.read()
-        except FileNotFoundError:
-            return ""
-
-    def start(self, *command, output=subprocess.DEVNULL):
-        process = subprocess.Popen(command, stdout=output, stderr=subprocess.DEVNULL)
-        self.addCleanup(self.end, process)
+    def start(self, *command, output=os.devnull):
+        process = start(*command, output=output)
+        self.addCleanup(end, process)
         return process
-
-    def end(self, process):
-        process.kill()
-        process.wait()
 
     @staticmethod
     def close_panel():
@@ -122,18 +97,18 @@ class StatusHosts(unittest.TestCase):
             self.open_at(x, y, button)
             click(x, y, button)
             wait_until("the panel to close at the second click", lambda: not PANEL.is_open())
-        actions = self.read(self.record).count("menu.onAction received")
+        actions = self.home.read("record").count("menu.onAction received")
         self.open_at(x, y)
         press("ctrl+a")  # the last search may still be there
         type_text("calcul")
         press("Return")
-        wait_until("the action", lambda: self.read(self.record).count("menu.onAction received") > actions)
-        self.assertIn("Calculator", self.read(self.record).rsplit("menu.onAction received", 1)[1])
+        wait_until("the action", lambda: self.home.read("record").count("menu.onAction received") > actions)
+        self.assertIn("Calculator", self.home.read("record").rsplit("menu.onAction received", 1)[1])
         wait_until("the panel to close", lambda: not PANEL.is_open())
 
     def moves_to_strip_and_back(self, command, host, is_back):
         """With the panel open. A window manager may take the keyboard when the bar dies, which closes the panel."""
-        self.end(host)
+        end(host)
         wait_until("the item in the strip", item_is_in_strip)
         wait_until("the item selected if the panel is open", lambda: is_selected(STRIP) == PANEL.is_open())
         host = self.start(*command)
@@ -153,7 +128,7 @@ class StatusHosts(unittest.TestCase):
         wait_until("the highlight in the new tray, too", lambda: is_selected(item_is_in_tray()) == PANEL.is_open())
         self.close_panel()
         wait_until("the highlight to go", lambda: not is_selected(item_is_in_tray()))
-        self.end(host)
+        end(host)
         wait_until("the strip", item_is_in_strip)
         return (x, y, width, height), panel
 
@@ -178,9 +153,8 @@ class StatusHosts(unittest.TestCase):
         self.assertLessEqual(top, y + height)
 
     def test_bar_on_the_bus(self):
-        with open(self.home.name + "/bus", "w", encoding="utf-8") as traffic:
-            self.start("dbus-monitor", "--session", output=traffic)
-        wait_until("the monitor", lambda: self.read(traffic.name))
+        self.start("dbus-monitor", "--session", output=self.home.name + "/bus")
+        wait_until("the monitor", lambda: self.home.read("bus"))
         host = self.start("lxqt-panel")
 
         def is_there():
@@ -189,17 +163,17 @@ class StatusHosts(unittest.TestCase):
         x, y = 1268, 784
         self.opens_by_any_button_and_types(x, y, (1, 2, 3))
         for member in ("Activate", "SecondaryActivate", "ContextMenu"):
-            self.assertRegex(self.read(traffic.name), rf"member={member}\n +int32 {x}\n +int32 {y}\n")
-        self.assertEqual(len(re.findall("member=RegisterStatusNotifierItem", self.read(traffic.name))), 1)
-        icons = self.read(traffic.name).count("member=NewIcon")
+            self.assertRegex(self.home.read("bus"), rf"member={member}\n +int32 {x}\n +int32 {y}\n")
+        self.assertEqual(len(re.findall("member=RegisterStatusNotifierItem", self.home.read("bus"))), 1)
+        icons = self.home.read("bus").count("member=NewIcon")
         self.open_at(x, y)
-        wait_until("the selected icon", lambda: self.read(traffic.name).count("member=NewIcon") > icons)
+        wait_until("the selected icon", lambda: self.home.read("bus").count("member=NewIcon") > icons)
         _, top, _, height = PANEL.frame()
         self.assertEqual(top + height, SCREEN[1] - 32, "right above the bar")
         host = self.moves_to_strip_and_back(["lxqt-panel"], host, is_there)
         self.close_panel()
         self.opens_by_any_button_and_types(x, y, (1,))
-        self.end(host)
+        end(host)
         wait_until("the strip", item_is_in_strip)
 
 

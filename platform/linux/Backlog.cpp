@@ -29,11 +29,13 @@ bool Backlog::admits(int sender) {
     const std::lock_guard lock(m_mutex);
     const auto found = m_senders.find(sender);
     if (found == m_senders.end()) return true;
-    found->second.refused = !found->second.isWithin(ofSender);
     const bool isFull = !m_all.isWithin(ofAll);
+    const bool isRefused = isFull || !found->second.isWithin(ofSender);
     m_all.refused |= isFull;
-    found->second.refused |= isFull;
-    return !found->second.refused;
+    // Letting in one of the sender's connections looks like the end of it, and another may still wait for the
+    // call.
+    found->second.refused |= isRefused;
+    return !isRefused;
 }
 
 void Backlog::add(int sender, std::size_t bytes) {

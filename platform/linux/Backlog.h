@@ -17,7 +17,7 @@ public:
     };
     /// The last message that is let in may be of any size, so a sender keeps that much more at most. The
     /// small number of messages keeps the others' from waiting behind a flood.
-    static constexpr Bounds ofSender{64, std::size_t{64} << 20};
+    static constexpr Bounds ofSender{16, std::size_t{64} << 20};
     /// Beyond this, only who has nothing waiting is let in.
     static constexpr Bounds ofAll{4096, std::size_t{512} << 20};
 

@@ -63,7 +63,7 @@ struct HostilePackets : testing::Test {
                 accepted.push_back(std::move(changed));
             else
                 ASSERT_FALSE(survives({changed})) << at << " by " << change;
-            if (accepted.size() < 16 && change < 255) continue;
+            if (accepted.size() < 15 && change < 255) continue; // with the last, as many as are let in
             ASSERT_TRUE(survives(std::exchange(accepted, {}))) << at;
         }
     }

@@ -47,13 +47,23 @@ TEST(Backlog, admitsEachSenderUpToItsQuotaAndAllUpToTheWhole) {
     EXPECT_EQ(calls, 2);
     EXPECT_TRUE(backlog.admits(1));
     EXPECT_TRUE(backlog.admits(2));
+
+    // A sender with two connections: the one that is let in again must not make the other be forgotten.
+    for (std::size_t i = 0; i < messages; ++i)
+        backlog.add(4, 0);
+    EXPECT_FALSE(backlog.admits(4));
+    backlog.remove(4, 0);
+    EXPECT_TRUE(backlog.admits(4));
+    for (std::size_t i = 1; i < messages; ++i)
+        backlog.remove(4, 0);
+    EXPECT_EQ(calls, 3);
 }
 
 TEST_F(BackPressure, aReceiverThatHangsCostsItsSendersNothingButWhatTheyDrop) {
     Listener listener(loop, server, name);
     const auto remote = client.connect(name);
-    constexpr int sent = 240; // more than are kept
-    constexpr auto size = std::size_t{2} << 20;
+    constexpr int sent = 60; // more than are kept
+    constexpr auto size = std::size_t{8} << 20;
     const std::string rest(size, ' ');
     for (int i = 0; i < sent; ++i)
         ASSERT_EQ(Send(*remote, std::to_string(i) + rest), SendStatus::success);
@@ -82,8 +92,8 @@ TEST_F(BackPressure, aReceiverThatHangsCostsItsSendersNothingButWhatTheyDrop) {
     ASSERT_TRUE(loop.runUntil([&] { return handle() || handled > sent / 4; }));
     remote->send({}, false, {20s, 20s});
     ASSERT_TRUE(loop.runUntil(handle));
-    EXPECT_GT(handled, 150);
-    EXPECT_LT(handled, 210) << "as many on their way as are let in, and 256 MiB in the queue";
+    EXPECT_GT(handled, 37);
+    EXPECT_LT(handled, 53) << "as many on their way as are let in, and 256 MiB in the queue";
 }
 
 TEST_F(BackPressure, aSenderHasSoManyConnectionsAndNoMore) {
@@ -97,9 +107,10 @@ TEST_F(BackPressure, aSenderHasSoManyConnectionsAndNoMore) {
     for (const auto& peer : peers)
         peer->send(GoodPackets().front());
     ASSERT_TRUE(listener.waitFor(peers.size()));
+    listener.arrivals().clear();
     peers.pop_back();
     EXPECT_TRUE(loop.runUntil([&] {
         RawPeer(directory, name).trySend(GoodPackets().front().bytes);
-        return listener.arrivals().size() > 16;
+        return !listener.arrivals().empty();
     })) << "once one has gone";
 }

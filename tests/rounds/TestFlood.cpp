@@ -101,7 +101,7 @@ TEST(Flood, LosesNothingAndCostsOthersATurnAndTheServerNoMoreThanTheQuota) {
     ASSERT_GT(overtaken.size(), 16U);
     const auto middle = overtaken.begin() + std::ssize(overtaken) / 2;
     std::ranges::nth_element(overtaken, middle);
-    EXPECT_LE(*middle, 200U) << "each flood's quota, and a turn of each";
+    EXPECT_LE(*middle, 80U) << "each flood's quota, and a turn of each";
     EXPECT_LE(mapped, platform::Backlog::ofSender.bytes + 2 * kinds[1].size);
 }
 

@@ -9,6 +9,7 @@
 
 #include <algorithm>
 #include <chrono>
+#include <cstddef>
 #include <deque>
 #include <iterator>
 #include <memory>
@@ -19,6 +20,13 @@
 #include <thread>
 #include <utility>
 #include <vector>
+
+namespace {
+
+// A port counts what has arrived by its bytes, which stand for what binary ones take in memory.
+constexpr plist::Limits limits{.xmlBytes = std::size_t{1} << 20};
+
+} // namespace
 
 /// One port from start to end notice. What arrived waits here; a task posted to the main loop takes a few
 /// things out, and posts the next: so all of it goes when the worker goes, whatever is still posted.
@@ -83,7 +91,7 @@ private:
     void WorkerThreadOnMessageReceived(platform::Arrival& arrival, std::vector<Delivery>& group) {
         constexpr auto routine = "WorkerThreadOnMessageReceived";
         std::string error;
-        auto envelope = plist::Parse(arrival.bytes, error);
+        auto envelope = plist::Parse(arrival.bytes, error, limits);
         if (error.empty()) error = KXIPCEnvelopeError(envelope);
         if (error.empty() && KXIPCEnvelopeIsFrom(envelope, arrival.sender)) {
             group.push_back({std::move(envelope), std::move(arrival.receipt)});

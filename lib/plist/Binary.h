@@ -20,6 +20,7 @@ struct Limits {
     /// Counted each time it is referred to; a string counts once more for every 64 bytes.
     std::size_t objects = 4'000'000;
     unsigned nesting = kDeepestNesting; ///< arrays and dictionaries within each other
+    std::size_t xmlBytes = bytes;       ///< the same for XML, which takes ten times its size in memory
 };
 
 /// The value, or nil and why in `error`. Linear in the size of `bytes`; the result shares them.

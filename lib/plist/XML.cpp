@@ -193,7 +193,7 @@ void attach(XML_Parser parser, Builder& builder) {
 } // namespace
 
 Value ParseXML(const Data& bytes, std::string& error, const Limits& limits) {
-    if (bytes.size() > std::min<std::size_t>(limits.bytes, INT_MAX)) {
+    if (bytes.size() > std::min<std::size_t>({limits.bytes, limits.xmlBytes, INT_MAX})) {
         error = "the file is too large";
         return {};
     }

@@ -90,6 +90,7 @@ TEST(XML, IsBounded) {
     EXPECT_EQ(errorOf(listOf("<string>" + std::string(640, 'x') + "</string>"), {.objects = 10}),
               "line 1: too many objects");
     EXPECT_EQ(errorOf(listOf("<true/>"), {.bytes = 20}), "the file is too large");
+    EXPECT_EQ(errorOf(listOf("<true/>"), {.xmlBytes = 20}), "the file is too large");
 
     const std::string entity = "<!DOCTYPE plist [<!ENTITY a \"aaaa\">]>" + listOf("<string>&a;</string>");
     EXPECT_EQ(errorOf(entity), "line 1: it declares an entity");

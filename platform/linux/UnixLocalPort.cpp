@@ -34,7 +34,8 @@ namespace {
 constexpr std::uint64_t wakeTag = 0;
 constexpr std::uint64_t listenerTag = 1;
 constexpr std::size_t largestGroup = 16;
-constexpr int connectionsOfSender = 16; // the library keeps one, and opens another now and then to look
+constexpr int connectionsOfSender = 16;       // the library keeps one, and opens another now and then to look
+constexpr std::size_t connectionsOfAll = 512; // half of the descriptors that a process usually may have
 } // namespace
 
 UnixLocalPort::UnixLocalPort(OwnedName name, const Clock& clock, PortTap& tap)
@@ -48,8 +49,7 @@ UnixLocalPort::UnixLocalPort(OwnedName name, const Clock& clock, PortTap& tap)
     , m_spare(::open("/dev/null", O_RDONLY | O_CLOEXEC))
     , m_name(std::move(name))
     , m_lastTag(listenerTag) {
-    watch(m_wake->get(), wakeTag);
-    watch(m_name->listener(), listenerTag);
+    m_canListen = watch(m_wake->get(), wakeTag) && watch(m_name->listener(), listenerTag);
 }
 
 UnixLocalPort::~UnixLocalPort() {
@@ -87,11 +87,11 @@ void UnixLocalPort::close() {
     eventfd_write(m_wake->get(), 1);
 }
 
-void UnixLocalPort::watch(int descriptor, std::uint64_t tag) {
+bool UnixLocalPort::watch(int descriptor, std::uint64_t tag) {
     epoll_event event = {};
     event.events = EPOLLIN;
     event.data.u64 = tag;
-    epoll_ctl(m_epoll.get(), EPOLL_CTL_ADD, descriptor, &event);
+    return epoll_ctl(m_epoll.get(), EPOLL_CTL_ADD, descriptor, &event) == 0;
 }
 
 void UnixLocalPort::accept() {
@@ -106,11 +106,12 @@ void UnixLocalPort::accept() {
     getsockopt(socket.get(), SOL_SOCKET, SO_PEERCRED, &sender, &size);
     if (sender.uid != m_user) return complain(sender.pid, "another user's");
     const auto isOfSender = [&](const auto& entry) { return entry.second->peer().processID == sender.pid; };
-    if (std::ranges::count_if(m_connections, isOfSender) >= connectionsOfSender)
+    if (std::ranges::count_if(m_connections, isOfSender) >= connectionsOfSender ||
+        m_connections.size() >= connectionsOfAll)
         return complain(sender.pid, "too many");
     const PortPeer peer{sender.pid, SerialNumberOfPeer(sender.pid)};
     const auto tag = ++m_lastTag;
-    watch(socket.get(), tag);
+    if (!watch(socket.get(), tag)) return complain(sender.pid, "the system has no room to wait for it");
     m_connections.emplace(tag, std::make_shared<IncomingConnection>(std::move(socket), peer, m_backlog));
     ++m_tap.counters.connections;
 }
@@ -178,8 +179,7 @@ void UnixLocalPort::resumePaused() {
         const auto found = m_connections.find(tag);
         if (found == m_connections.end()) return true;
         if (!m_backlog->admits(found->second->peer().processID)) return false;
-        watch(found->second->socket(), tag);
-        return true;
+        return watch(found->second->socket(), tag);
     });
 }
 

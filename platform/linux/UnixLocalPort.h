@@ -28,11 +28,13 @@ public:
     UnixLocalPort(const UnixLocalPort&) = delete;
     UnixLocalPort& operator=(const UnixLocalPort&) = delete;
 
+    /// False when the system had no descriptors for it.
+    bool canListen() const { return m_canListen; }
     void run(const Receiver& receiver) override;
     void close() override;
 
 private:
-    void watch(int descriptor, std::uint64_t tag);
+    bool watch(int descriptor, std::uint64_t tag);
     void accept();
     void refuseOne();
     void read(std::uint64_t tag, PacketReader& reader, std::vector<Arrival>& group);
@@ -52,6 +54,7 @@ private:
     const std::shared_ptr<Backlog> m_backlog;
     Descriptor m_epoll;
     Descriptor m_spare; ///< given up for a moment to refuse a connection when there are no descriptors left
+    bool m_canListen = false;
     std::atomic<bool> m_closed = false;
 
     std::mutex m_mutex; ///< guards what follows

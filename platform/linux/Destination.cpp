@@ -65,7 +65,8 @@ Destination::Destination(const PortNames& names, const Clock& clock, PortTap& ta
 bool Destination::connect() {
     const std::lock_guard lock(m_mutex);
     // Whether that one has ended, the next message will tell.
-    return m_socket || openConnection() != Sending::hungUp;
+    m_isBelieved = m_socket || openConnection() != Sending::hungUp;
+    return m_isBelieved;
 }
 
 SendStatus Destination::send(BytePieces pieces, bool synchronous, RemotePort::Timeouts timeouts) {
@@ -102,7 +103,7 @@ bool Destination::takeEnd() {
 
 bool Destination::isIdle() const {
     const std::lock_guard lock(m_mutex);
-    return !m_socket && m_queue.empty();
+    return !m_socket && m_queue.empty() && !m_ended;
 }
 
 Destination::Socket Destination::socket() const {
@@ -127,6 +128,7 @@ std::optional<Destination::Pending> Destination::flush() {
         for (std::size_t i = 0; i < given; ++i)
             giveUpFirst(StatusFrom(sending));
     }
+    m_isFlushed = false;
     return std::nullopt;
 }
 
@@ -177,6 +179,8 @@ Destination::Transmission Destination::transmit(std::unique_lock<std::mutex>& lo
     for (int attempt = 0; attempt < 2; ++attempt) {
         if (!m_socket) {
             const auto opening = openConnection();
+            // Whoever was told of an owner that was only too busy has to hear of its end, too.
+            if (opening == Sending::hungUp && m_isBelieved) endConnection();
             if (opening != Sending::taken) return {opening};
         }
         if (first.hasDescriptor() && !hasRoomOnTheWay(first)) return {Sending::exhausted};
@@ -204,6 +208,7 @@ bool Destination::hasRoomOnTheWay(const OutgoingPacket& packet) {
 void Destination::endConnection() {
     m_socket.reset();
     m_onTheWay = 0;
+    m_isBelieved = false;
     m_ended = true;
     m_delegate.didChangeConnection(m_name);
 }
@@ -226,7 +231,7 @@ std::shared_ptr<Destination::Waiting> Destination::enqueue(OutgoingPacket packet
     packet.own();
     countQueued(packet, true);
     m_queue.push_back(std::make_shared<Waiting>(Waiting{std::move(packet), deadline}));
-    if (m_queue.size() == 1) m_delegate.didQueue(shared_from_this());
+    if (!m_isFlushed) m_isFlushed = m_delegate.didQueue(shared_from_this());
     return m_queue.back();
 }
 

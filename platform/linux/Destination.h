@@ -23,8 +23,8 @@ public:
     class Delegate {
     public:
         virtual ~Delegate() = default;
-        /// Messages wait now, and did not before.
-        virtual void didQueue(std::shared_ptr<Destination> destination) = 0;
+        /// Messages wait now, and did not before. Whether `flush` will be called until none are left.
+        virtual bool didQueue(std::shared_ptr<Destination> destination) = 0;
         /// There is another connection, or none.
         virtual void didChangeConnection(const std::string& name) = 0;
     };
@@ -42,7 +42,7 @@ public:
     void drain();
     /// Whether a connection has ended since this was asked last.
     bool takeEnd();
-    bool isIdle() const; ///< neither a connection nor messages
+    bool isIdle() const; ///< neither a connection nor messages nor an end to tell of
 
     // For any thread.
 
@@ -107,6 +107,8 @@ private:
     std::size_t m_transmitting = 0; ///< so many of the first in the queue
     std::size_t m_queuedBytes = 0;
     std::size_t m_queuedDescriptors = 0;
+    bool m_isFlushed = false;
+    bool m_isBelieved = false; ///< `connect` has said that there is an owner
     bool m_ended = false;
     bool m_warned = false; ///< about this connection's receiver
 };

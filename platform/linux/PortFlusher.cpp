@@ -43,18 +43,21 @@ PortFlusher::~PortFlusher() {
     m_thread.join();
 }
 
-void PortFlusher::add(std::shared_ptr<Destination> destination) {
+bool PortFlusher::add(std::shared_ptr<Destination> destination) {
     const std::lock_guard lock(m_mutex);
     m_added.push_back(std::move(destination));
     if (m_thread.joinable()) {
         eventfd_write(m_wake.get(), 1);
-        return;
+        return true;
     }
     try {
         m_thread = std::thread([this] { run(); });
+        return true;
     } catch (const std::system_error& error) {
-        // What waits is given up when it is overdue; the message after it tries again.
-        Warning("Cannot start the thread that sends: %s\n", error.what());
+        // The next message tries again.
+        Warning("IPC: %s: cannot start the thread that sends: %s\n", "PortFlusher::add", error.what());
+        m_added.clear();
+        return false;
     }
 }
 

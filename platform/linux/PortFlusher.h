@@ -20,8 +20,9 @@ public:
     PortFlusher(const PortFlusher&) = delete;
     PortFlusher& operator=(const PortFlusher&) = delete;
 
-    /// For a destination whose queue is no longer empty. Main thread.
-    void add(std::shared_ptr<Destination> destination);
+    /// For a destination whose queue is no longer empty. False when there is no thread to be had. Main
+    /// thread.
+    bool add(std::shared_ptr<Destination> destination);
 
 private:
     using Instant = std::chrono::steady_clock::time_point;

@@ -43,7 +43,8 @@ UnixMessagePorts::~UnixMessagePorts() {
 std::unique_ptr<LocalPort> UnixMessagePorts::open(const std::string& name) {
     auto owned = m_names.take(name);
     if (!owned) return nullptr;
-    return std::make_unique<UnixLocalPort>(std::move(*owned), m_clock, m_tap);
+    auto port = std::make_unique<UnixLocalPort>(std::move(*owned), m_clock, m_tap);
+    return port->canListen() ? std::move(port) : nullptr;
 }
 
 std::unique_ptr<RemotePort> UnixMessagePorts::connect(const std::string& name) {
@@ -57,6 +58,12 @@ std::unique_ptr<RemotePort> UnixMessagePorts::connect(const std::string& name) {
         if (destination->takeEnd() || m_believed.contains(name)) noteEnd(name);
         return nullptr;
     }
+    // One that the flusher still held when its connection ended was left over.
+    if (known == m_destinations.end())
+        std::erase_if(m_destinations, [](const auto& entry) {
+            const auto& other = entry.second.destination;
+            return other.use_count() == 1 && other->isIdle();
+        });
     m_destinations.try_emplace(name, Watched{destination});
     return std::make_unique<UnixRemotePort>(destination);
 }
@@ -79,8 +86,8 @@ std::vector<std::string> UnixMessagePorts::listeningNames() {
     return m_names.listeningNames();
 }
 
-void UnixMessagePorts::didQueue(std::shared_ptr<Destination> destination) {
-    m_flusher->add(std::move(destination));
+bool UnixMessagePorts::didQueue(std::shared_ptr<Destination> destination) {
+    return m_flusher->add(std::move(destination));
 }
 
 void UnixMessagePorts::didChangeConnection(const std::string& name) {

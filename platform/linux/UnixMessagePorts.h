@@ -35,7 +35,7 @@ private:
         std::unique_ptr<Handle> watch{}; // ends before the socket does
     };
 
-    void didQueue(std::shared_ptr<Destination> destination) override;
+    bool didQueue(std::shared_ptr<Destination> destination) override;
     void didChangeConnection(const std::string& name) override;
     void update(const std::string& name);
     void noteEnd(const std::string& name);

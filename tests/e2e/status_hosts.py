@@ -160,6 +160,13 @@ class StatusHosts(unittest.TestCase):
         def is_there():
             return not ITEM.frame() and inked(1258, 774, 20, 20)
         wait_until("the icon in the bar", is_there)
+        bus = ("dbus-send", "--session", "--print-reply")
+        name, = re.findall(r'"(org\.kde\.StatusNotifierItem-.*)"', run(*bus, "--dest=org.freedesktop.DBus", "/",
+                                                                      "org.freedesktop.DBus.ListNames"))
+        item = run(*bus, "--dest=" + name, "/StatusNotifierItem", "org.freedesktop.DBus.Properties.GetAll",
+                   "string:org.kde.StatusNotifierItem")
+        self.assertEqual(item.count('"Start menu"'), 2, "title and tooltip")
+        self.assertGreater(len(re.findall(r"int32 (\d+)\n +int32 \1\n", item)), 3, "sizes of the icon")
         x, y = 1268, 784
         self.opens_by_any_button_and_types(x, y, (1, 2, 3))
         for member in ("Activate", "SecondaryActivate", "ContextMenu"):

@@ -5,13 +5,10 @@ With KX_TEST_BIN naming the programs' folder. The compositor draws to memory, an
 
 import os
 import re
-import shutil
-import subprocess
 import sys
-import tempfile
 import unittest
 
-from desktop import Picture, Window, run, wait_until
+from desktop import Home, Picture, Window, run, start, wait_until
 
 BIN = os.environ["KX_TEST_BIN"]
 AGENT = BIN + "/corvane-tesselStartMenu"
@@ -33,49 +30,28 @@ exec env >{0}/session
 class Wayland(unittest.TestCase):
     @classmethod
     def setUpClass(cls):
-        cls.home = tempfile.mkdtemp()
-        os.mkdir(cls.home + "/runtime", 0o700)
-        cls.record = cls.home + "/record"
-        config = cls.write("config", CONFIG.format(cls.home))
+        cls.home = Home()
+        os.mkdir(cls.home.name + "/runtime", 0o700)
+        config = cls.home.write("sway", CONFIG.format(cls.home.name))
         for name in ("DISPLAY", "WAYLAND_DISPLAY", "DBUS_SESSION_BUS_ADDRESS"):
             os.environ.pop(name, None)
-        os.environ.update(HOME=cls.home, XDG_RUNTIME_DIR=cls.home + "/runtime", XDG_DATA_HOME=cls.home + "/data",
-                          XDG_CONFIG_HOME=cls.home + "/config-home", WLR_BACKENDS="headless",
+        os.environ.update(XDG_RUNTIME_DIR=cls.home.name + "/runtime", WLR_BACKENDS="headless",
                           WLR_LIBINPUT_NO_DEVICES="1", WLR_RENDERER="pixman")
-        cls.processes = []
-        cls.start("dbus-run-session", "--", "sway", "-c", config)
-        session = wait_until("the compositor", lambda: re.search("^DISPLAY=.*\n", cls.read("session"), re.M) and cls.read("session"))
+        cls.processes = [start("dbus-run-session", "--", "sway", "-c", config)]
+        session = wait_until("the compositor", lambda: re.search("^DISPLAY=.*\n", cls.home.read("session"), re.M) and cls.home.read("session"))
         os.environ.update(line.split("=", 1) for line in session.splitlines()
                           if re.match("DISPLAY|WAYLAND_DISPLAY|DBUS_SESSION_BUS_ADDRESS|SWAYSOCK", line))
-        cls.start(BIN + "/tesselDaemon", "--record", cls.record, "--machine", "Sample guest")
+        cls.processes.append(start(BIN + "/tesselDaemon", "--record", cls.home.name + "/record",
+                                   "--machine", "Sample guest"))
         wait_until("the item in the bar", cls.item)
-        wait_until("an update", lambda: "menu.update sent" in cls.read("record"))
-
-    @classmethod
-    def start(cls, *command):
-        cls.processes.append(subprocess.Popen(command, stdout=subprocess.DEVNULL,
-                                              stderr=subprocess.DEVNULL))
+        wait_until("an update", lambda: "menu.update sent" in cls.home.read("record"))
 
     @classmethod
     def tearDownClass(cls):
         for process in reversed(cls.processes):
             process.terminate()
             process.wait()
-        shutil.rmtree(cls.home, ignore_errors=True)
-
-    @classmethod
-    def write(cls, name, text):
-        with open(f"{cls.home}/{name}", "w", encoding="utf-8") as file:
-            file.write(text)
-        return file.name
-
-    @classmethod
-    def read(cls, name):
-        try:
-            with open(f"{cls.home}/{name}", encoding="utf-8", errors="replace") as file:
-                return file.read()
-        except FileNotFoundError:
-            return ""
+        cls.home.cleanup()
 
     @classmethod
     def item(cls):
@@ -104,8 +80,8 @@ class Wayland(unittest.TestCase):
         left = self.pixel(x + 60, y + height - 60)
         self.assertGreater(min(left), 60, "no black behind the left pane")
         run("wtype", "-k", "Shift_L", "-s", "200", "calcul", "-s", "200", "-k", "Return")
-        wait_until("the action", lambda: "menu.onAction received" in self.read("record"))
-        self.assertIn("Calculator", self.read("record").rsplit("menu.onAction received", 1)[1])
+        wait_until("the action", lambda: "menu.onAction received" in self.home.read("record"))
+        self.assertIn("Calculator", self.home.read("record").rsplit("menu.onAction received", 1)[1])
         wait_until("the panel to close", lambda: not PANEL.is_open())
 
 

@@ -126,9 +126,14 @@ KX_AVX2 void permuteRows(const RasterBlock& block, const std::uint8_t* from, std
     for (std::size_t y = 0; y < block.height; ++y, to += block.bytesPerRow, from += fromBytesPerRow) {
         std::int64_t at = rowBytes >= 16 * vectorBytes ? storeUpToBoundary(to, from, shuffle) : 0;
         const std::int64_t inFours = at + ((rowBytes - at) & -4 * vectorBytes);
-        for (; at < inFours; at += 4 * vectorBytes)
-            for (std::int64_t i = at; i < at + 4 * vectorBytes; i += vectorBytes)
-                storePixels(to + i, _mm256_shuffle_epi8(loadPixels(from + i, lanes), shuffle), lanes);
+        for (; at < inFours; at += 4 * vectorBytes) {
+            // Where a loop of one vector would stand in memory matters by a fifth.
+#pragma GCC unroll 4
+            for (int i = 0; i < 4; ++i)
+                storePixels(to + at + i * vectorBytes,
+                            _mm256_shuffle_epi8(loadPixels(from + at + i * vectorBytes, lanes), shuffle),
+                            lanes);
+        }
         for (std::int64_t left = (rowBytes - at) / 4; left > 0; left -= lanes, at += vectorBytes)
             storePixels(to + at, _mm256_shuffle_epi8(loadPixels(from + at, left), shuffle), left);
     }

@@ -48,6 +48,7 @@ class Wayland(unittest.TestCase):
 
     @classmethod
     def tearDownClass(cls):
+        run("swaymsg", "exit")  # and with it the bus
         for process in reversed(cls.processes):
             process.terminate()
             process.wait()

@@ -22,7 +22,7 @@ public:
 /// One named port and the worker thread that reads and parses what arrives there. The worker never waits for
 /// the main thread. Main thread only; the delegate must outlive it.
 ///
-/// Of a sender 64 messages or 64 MiB wait here to be handled, of all together 4096 and 512 MiB, but for the
+/// Of a sender 16 messages or 64 MiB wait here to be handled, of all together 4096 and 512 MiB, but for the
 /// last message of each sender, which may be of any size; what is more waits at the senders. What cannot be
 /// parsed, or names another sender, is dropped with a log entry, ten a minute and sender.
 class KXIPCMessageReceiver {

@@ -155,6 +155,14 @@ Sending Destination::openConnection() {
     return Sending::taken;
 }
 
+Sending Destination::reopenConnection() {
+    if (m_socket) return Sending::taken;
+    const auto opening = openConnection();
+    // Whoever was told of an owner that was only too busy has to hear of its end, too.
+    if (opening == Sending::hungUp && m_isBelieved) endConnection();
+    return opening;
+}
+
 /// The one that is first in the queue, and those after it that can go along.
 Destination::Transmission Destination::transmitFirst(std::unique_lock<std::mutex>& lock) {
     std::array<std::shared_ptr<Waiting>, OutgoingPacket::largestGroup> kept;
@@ -177,12 +185,8 @@ Destination::Transmission Destination::transmitFirst(std::unique_lock<std::mutex
 Destination::Transmission Destination::transmit(std::unique_lock<std::mutex>& lock, Packets packets) {
     const auto& first = *packets.front();
     for (int attempt = 0; attempt < 2; ++attempt) {
-        if (!m_socket) {
-            const auto opening = openConnection();
-            // Whoever was told of an owner that was only too busy has to hear of its end, too.
-            if (opening == Sending::hungUp && m_isBelieved) endConnection();
-            if (opening != Sending::taken) return {opening};
-        }
+        const auto opening = reopenConnection();
+        if (opening != Sending::taken) return {opening};
         if (first.hasDescriptor() && !hasRoomOnTheWay(first)) return {Sending::exhausted};
         const auto socket = m_socket;
         lock.unlock();

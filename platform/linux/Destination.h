@@ -65,6 +65,7 @@ private:
     using Queue = std::deque<std::shared_ptr<Waiting>>;
 
     Sending openConnection();
+    Sending reopenConnection();
     using Packets = std::span<const OutgoingPacket* const>;
     struct Transmission {
         Sending sending;

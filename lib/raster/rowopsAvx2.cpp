@@ -2,7 +2,6 @@
 #include "lib/raster/pixel.h"
 #include "lib/raster/rowops.h"
 
-#include <algorithm>
 #include <cstddef>
 #include <cstdint>
 #include <cstring>

@@ -1,5 +1,4 @@
 #include "lib/raster/avx2.h"
-#include "lib/raster/pixel.h"
 #include "lib/raster/rasterops.h"
 #include "lib/raster/rowops.h"
 

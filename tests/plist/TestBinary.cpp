@@ -145,13 +145,13 @@ TEST(Binary, RefusesToWriteWhatCannotBeRead) {
     EXPECT_EQ(errorOf(std::string(1000, 'x'), {.bytes = 1000}), "the property list is too large");
     EXPECT_EQ(errorOf(Array{1, 1, 1}, {.objects = 3}), "too many objects");
 
-    const Value shared = Array{Array{1}};
+    const Value inner = Array{1}, shared = Array{inner}, outer = Array{shared};
     std::string error;
     EXPECT_EQ(WriteBinary(Array{shared, shared}, error, {.objects = 7}).pieces.size(), 1u) << error;
     EXPECT_EQ(errorOf(Array{shared, shared}, {.objects = 6}), "too many objects");
     // Met first near the top, then again where it no longer fits.
-    EXPECT_EQ(errorOf(Array{shared, Array{Array{shared}}}, {.nesting = 4}), "nested too deeply");
-    EXPECT_EQ(WriteBinary(Array{shared, Array{Array{shared}}}, error, {.nesting = 5}).pieces.size(), 1u);
+    EXPECT_EQ(errorOf(Array{shared, Array{outer, 1}}, {.nesting = 4}), "nested too deeply");
+    EXPECT_EQ(WriteBinary(Array{shared, Array{outer, 1}}, error, {.nesting = 5}).pieces.size(), 1u);
 
     Value deep = 1;
     for (unsigned i = 0; i < kDeepestNesting; ++i)

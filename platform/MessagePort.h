@@ -100,6 +100,10 @@ public:
     /// one that was there for `isListening` is gone when we connect.
     using HangUpHandler = std::function<void(const std::string& name)>;
     virtual void setHangUpHandler(HangUpHandler handler) = 0;
+
+    /// Whether one more log entry about a peer may be written, ten a minute in all; counts it if so. A peer
+    /// is a process id in digits, or the name of a port that is sent to. Any thread.
+    virtual bool mayLogAbout(const std::string& peer) = 0;
 };
 
 } // namespace platform

@@ -1,21 +1,24 @@
 #pragma once
 
 #include <chrono>
+#include <mutex>
+#include <string>
 #include <unordered_map>
 
-/// Keeps a peer that sends rubbish from filling the log: ten entries a minute for each process. For one
-/// thread at a time.
+/// Keeps a peer that sends rubbish, or takes nothing, from filling the log: ten entries a minute for each.
+/// Any thread.
 class LogLimit {
 public:
     using Instant = std::chrono::steady_clock::time_point;
 
-    /// Whether one more entry about that process may be written; counts it if so.
-    bool allows(int processID, Instant now);
+    /// Whether one more entry about that peer may be written; counts it if so.
+    bool allows(const std::string& peer, Instant now);
 
 private:
     struct Window {
         Instant start;
         int entries = 0;
     };
-    std::unordered_map<int, Window> m_windows;
+    std::mutex m_mutex; ///< guards what follows
+    std::unordered_map<std::string, Window> m_windows;
 };

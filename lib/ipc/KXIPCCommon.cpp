@@ -6,12 +6,16 @@
 #include "lib/ipc/KXIPCObserverEntry.h"
 #include "lib/kxAppKit/system/KXProcess.h"
 #include "lib/plist/Value.h"
+#include "platform/MessagePort.h"
+#include "platform/ProcessTable.h"
 
 #include <algorithm>
-#include <chrono>
 #include <cstddef>
 #include <cstdint>
 #include <functional>
+#include <memory>
+#include <string>
+#include <tuple>
 #include <utility>
 #include <vector>
 
@@ -109,8 +113,7 @@ void KXIPCCommon::onRemoteMessageReceived(const plist::Value& envelope) {
         dispatchMessageToLocalListeners(message);
         return;
     }
-    const auto processID = static_cast<int>(KXProcessSerialNumberFromNumber(sender).lowLongOfPSN);
-    if (m_logLimit.allows(processID, std::chrono::steady_clock::now()))
+    if (m_context.ports.mayLogAbout(std::to_string(KXProcessSerialNumberFromNumber(sender).lowLongOfPSN)))
         Log("IPC: %s: dropping duplicate or out of order message\n",
             "-[KXIPCCommon onRemoteMessageReceived:]");
 }

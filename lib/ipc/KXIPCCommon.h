@@ -1,6 +1,5 @@
 #pragma once
 
-#include "lib/base/LogLimit.h"
 #include "lib/ipc/KXIPCContext.h"
 #include "lib/ipc/KXIPCMessage.h"
 #include "lib/ipc/KXIPCMessageReceiver.h"
@@ -9,6 +8,7 @@
 #include <cstddef>
 #include <cstdint>
 #include <functional>
+#include <memory>
 #include <string>
 #include <unordered_map>
 #include <utility>
@@ -70,7 +70,8 @@ private:
     std::unordered_map<const void*, std::size_t> m_places; ///< in the table, by token
     std::uint64_t m_removals = 0; ///< tells a dispatch under way whether to look again before it calls
     std::unordered_map<std::uint64_t, std::int32_t> m_lastMessageIDs; ///< by sender
-    LogLimit m_logLimit;
+    std::size_t m_mostSenders = 1024; ///< before it is asked which of them have ended
+    std::shared_ptr<const bool> m_alive = std::make_shared<bool>();
     std::function<void()> m_terminateSelector;
     KXIPCMessageReceiver m_messageReceiver;
 };

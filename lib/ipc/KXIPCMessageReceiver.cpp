@@ -1,14 +1,12 @@
 #include "lib/ipc/KXIPCMessageReceiver.h"
 
 #include "lib/base/Log.h"
-#include "lib/base/LogLimit.h"
 #include "lib/ipc/KXIPCEnvelope.h"
 #include "lib/plist/Binary.h"
 #include "lib/plist/Value.h"
 #include "platform/MessagePort.h"
 
 #include <algorithm>
-#include <chrono>
 #include <cstddef>
 #include <deque>
 #include <iterator>
@@ -34,6 +32,7 @@ class KXIPCMessageReceiver::Worker : public std::enable_shared_from_this<Worker>
 public:
     explicit Worker(KXIPCMessageReceiver& receiver)
         : m_receiver(receiver)
+        , m_ports(receiver.m_context.ports)
         , m_mainLoop(receiver.m_context.mainLoop) {}
 
     void start(std::unique_ptr<platform::LocalPort> port) {
@@ -97,7 +96,7 @@ private:
             group.push_back({std::move(envelope), std::move(arrival.receipt)});
             return;
         }
-        if (!m_logLimit.allows(arrival.sender.processID, std::chrono::steady_clock::now())) return;
+        if (!m_ports.mayLogAbout(std::to_string(arrival.sender.processID))) return;
         if (error.empty())
             Log("IPC: %s: dropping message that process %d sent in another's name\n", routine,
                 arrival.sender.processID);
@@ -157,11 +156,11 @@ private:
     }
 
     KXIPCMessageReceiver& m_receiver;
+    platform::MessagePorts& m_ports;
     platform::MainLoop& m_mainLoop;
     std::unique_ptr<platform::LocalPort> m_port;
     std::thread m_thread;
     bool m_hasTerminated = false;
-    LogLimit m_logLimit;
     std::deque<Delivery> m_ready; ///< main thread
     std::mutex m_mutex;           ///< guards what follows
     std::vector<Delivery> m_inbox;

@@ -24,7 +24,8 @@ public:
 ///
 /// Of a sender 16 messages or 64 MiB wait here to be handled, of all together 4096 and 512 MiB, but for the
 /// last message of each sender, which may be of any size; what is more waits at the senders. What cannot be
-/// parsed, or names another sender, is dropped with a log entry, ten a minute and sender.
+/// parsed, or names another sender, is dropped with a log entry: ten a minute and sender, with all
+/// else that is wrong with what it sends.
 class KXIPCMessageReceiver {
 public:
     KXIPCMessageReceiver(KXIPCContext& context, KXIPCMessageReceiverDelegate& delegate);

@@ -51,9 +51,10 @@ void KX_IPC_SendMessageToNamedPort(KXIPCContext& context, const KXIPCMessage& me
     using Status = platform::SendStatus;
     const auto port = context.ports.connect(portName);
     const auto status = port ? port->send(data.pieces, synchronous, timeouts) : Status::isInvalid;
+    if (status == Status::success || !context.ports.mayLogAbout(portName)) return;
     if (status == Status::isInvalid)
         Warning("IPC: %s: unable to create port, dropping message\n", routine);
-    else if (status != Status::success)
+    else
         Warning("IPC: %s: error %d sending message: %s\n", routine, static_cast<int>(status),
                 message.name().value_or("(null)").c_str());
 }

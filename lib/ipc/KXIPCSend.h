@@ -13,6 +13,7 @@
 /// port, and for 1000 seconds.
 ///
 /// What cannot be sent is logged and lost, and its number is used up: more than 256 MiB, a value that no
-/// property list can hold, nobody listening. What is dropped later is logged once for each connection.
+/// property list can hold, nobody listening; ten entries a minute for each port. What is dropped later is
+/// logged once for each connection.
 void KX_IPC_SendMessageToNamedPort(KXIPCContext& context, const KXIPCMessage& message,
                                    const std::string& portName, bool synchronous);

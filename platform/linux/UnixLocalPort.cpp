@@ -1,7 +1,6 @@
 #include "platform/linux/UnixLocalPort.h"
 
 #include "lib/base/Log.h"
-#include "platform/Clock.h"
 #include "platform/MessagePort.h"
 #include "platform/linux/Backlog.h"
 #include "platform/linux/Descriptor.h"
@@ -22,6 +21,7 @@
 #include <optional>
 #include <span>
 #include <sys/epoll.h>
+#include <string>
 #include <sys/eventfd.h>
 #include <sys/socket.h>
 #include <unistd.h>
@@ -38,8 +38,8 @@ constexpr int connectionsOfSender = 16;       // the library keeps one, and open
 constexpr std::size_t connectionsOfAll = 512; // half of the descriptors that a process usually may have
 } // namespace
 
-UnixLocalPort::UnixLocalPort(OwnedName name, const Clock& clock, PortTap& tap)
-    : m_clock(clock)
+UnixLocalPort::UnixLocalPort(OwnedName name, MessagePorts& ports, PortTap& tap)
+    : m_ports(ports)
     , m_tap(tap)
     , m_label(name.name())
     , m_user(geteuid())
@@ -193,7 +193,7 @@ void UnixLocalPort::remove(std::uint64_t tag) {
 }
 
 void UnixLocalPort::complain(int processID, const char* fault) {
-    if (!m_logLimit.allows(processID, m_clock.now())) return;
+    if (!m_ports.mayLogAbout(std::to_string(processID))) return;
     Log("IPC: %s: closing the connection of process %d: %s\n", m_label.c_str(), processID, fault);
 }
 

@@ -1,7 +1,5 @@
 #pragma once
 
-#include "lib/base/LogLimit.h"
-#include "platform/Clock.h"
 #include "platform/MessagePort.h"
 #include "platform/linux/PortNames.h"
 #include "platform/linux/PortPacket.h"
@@ -23,7 +21,7 @@ class IncomingConnection;
 /// no packet, or in another process's name, is cut off.
 class UnixLocalPort final : public LocalPort {
 public:
-    UnixLocalPort(OwnedName name, const Clock& clock, PortTap& tap);
+    UnixLocalPort(OwnedName name, MessagePorts& ports, PortTap& tap);
     ~UnixLocalPort() override;
     UnixLocalPort(const UnixLocalPort&) = delete;
     UnixLocalPort& operator=(const UnixLocalPort&) = delete;
@@ -46,7 +44,7 @@ private:
     void remove(std::uint64_t tag);
     void complain(int processID, const char* fault);
 
-    const Clock& m_clock;
+    MessagePorts& m_ports;
     PortTap& m_tap;
     const std::string m_label;
     const uid_t m_user;                             ///< whose packets are taken
@@ -62,7 +60,6 @@ private:
     std::unordered_map<std::uint64_t, std::shared_ptr<IncomingConnection>> m_connections;
     std::vector<std::uint64_t> m_paused; ///< those not read for now
     std::uint64_t m_lastTag;
-    LogLimit m_logLimit;
 };
 
 } // namespace platform

@@ -43,7 +43,7 @@ UnixMessagePorts::~UnixMessagePorts() {
 std::unique_ptr<LocalPort> UnixMessagePorts::open(const std::string& name) {
     auto owned = m_names.take(name);
     if (!owned) return nullptr;
-    auto port = std::make_unique<UnixLocalPort>(std::move(*owned), m_clock, m_tap);
+    auto port = std::make_unique<UnixLocalPort>(std::move(*owned), *this, m_tap);
     return port->canListen() ? std::move(port) : nullptr;
 }
 

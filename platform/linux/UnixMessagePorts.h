@@ -1,5 +1,6 @@
 #pragma once
 
+#include "lib/base/LogLimit.h"
 #include "platform/Clock.h"
 #include "platform/MainLoop.h"
 #include "platform/MessagePort.h"
@@ -26,6 +27,7 @@ public:
     bool isListening(const std::string& name) override;
     std::vector<std::string> listeningNames() override;
     void setHangUpHandler(HangUpHandler handler) override { m_hangUpHandler = std::move(handler); }
+    bool mayLogAbout(const std::string& peer) override { return m_logLimit.allows(peer, m_clock.now()); }
 
 private:
     /// A destination, and the connection of it that the main loop watches.
@@ -44,6 +46,7 @@ private:
     const Clock& m_clock;
     const PortNames m_names;
     PortTap m_tap;
+    LogLimit m_logLimit;
     HangUpHandler m_hangUpHandler;
     std::map<std::string, Watched> m_destinations;
     std::set<std::string> m_believed; ///< names whose owner somebody was told of

@@ -107,6 +107,9 @@ TEST_F(HostilePackets, EveryCutAndEveryChangeOfAByteIsDroppedOrUnderstood) {
         dispatched = 0;
     }
     EXPECT_EQ(server->clientsForMessage(KXIPCMessage("m", {}, {})).size(), 1U) << "the whole one works";
+    EXPECT_EQ(ScratchHome::logged("IPC: ") - ScratchHome::logged("unable to create port"), 10)
+        << "in a minute";
+    EXPECT_EQ(ScratchHome::logged("unable to create port"), 10) << "to confirm to";
 }
 
 } // namespace

@@ -98,6 +98,9 @@ TEST(KXIPCSend, EverySendUsesUpTheNextNumberWhateverBecomesOfIt) {
     send("a");
     ASSERT_TRUE(world.loop.runUntil([&] { return a.noted.size() == 2; }));
     EXPECT_EQ(a.noted[1], std::numeric_limits<std::int32_t>::min());
+    for (int i = 0; i < 20; ++i)
+        send("nobody");
+    EXPECT_EQ(World::logged("unable to create port"), 10) << "in a minute";
 }
 
 } // namespace

@@ -1,5 +1,6 @@
 #pragma once
 
+#include "lib/base/LogLimit.h"
 #include "platform/MainLoop.h"
 #include "platform/MessagePort.h"
 
@@ -27,6 +28,7 @@ public:
     bool isListening(const std::string& name) override;
     std::vector<std::string> listeningNames() override;
     void setHangUpHandler(HangUpHandler handler) override { m_hangUpHandler = std::move(handler); }
+    bool mayLogAbout(const std::string& peer) override { return m_logLimit.allows(peer, {}); }
 
 private:
     void noticeHangUp(const std::string& name);
@@ -36,6 +38,7 @@ private:
     platform::MainLoop& m_mainLoop;
     platform::PortPeer m_self;
     HangUpHandler m_hangUpHandler;
+    LogLimit m_logLimit; ///< of a minute that never ends
     std::map<std::string, std::shared_ptr<InMemoryPortNetwork::Mailbox>> m_connected;
     std::set<std::string> m_believed; ///< names whose owner somebody was told of
     std::set<std::string> m_ended;    ///< those whose owner has ended since

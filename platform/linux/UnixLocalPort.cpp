@@ -15,13 +15,14 @@
 #include <cerrno>
 #include <cstddef>
 #include <cstdint>
+#include <cstring>
 #include <fcntl.h>
 #include <memory>
 #include <mutex>
 #include <optional>
 #include <span>
-#include <sys/epoll.h>
 #include <string>
+#include <sys/epoll.h>
 #include <sys/eventfd.h>
 #include <sys/socket.h>
 #include <unistd.h>
@@ -36,6 +37,7 @@ constexpr std::uint64_t listenerTag = 1;
 constexpr std::size_t largestGroup = 16;
 constexpr int connectionsOfSender = 16;       // the library keeps one, and opens another now and then to look
 constexpr std::size_t connectionsOfAll = 512; // half of the descriptors that a process usually may have
+constexpr int restMilliseconds = 100;
 } // namespace
 
 UnixLocalPort::UnixLocalPort(OwnedName name, MessagePorts& ports, PortTap& tap)
@@ -61,8 +63,10 @@ void UnixLocalPort::run(const Receiver& receiver) {
     std::vector<Arrival> group;
     std::array<epoll_event, 64> events;
     while (!m_closed) {
-        const int count = epoll_wait(m_epoll.get(), events.data(), static_cast<int>(events.size()), -1);
+        const int count = epoll_wait(m_epoll.get(), events.data(), static_cast<int>(events.size()),
+                                     m_rests ? restMilliseconds : -1);
         if (count < 0 && errno != EINTR) return;
+        if (m_rests) listenAgain();
         for (const auto& event : std::span(events).first(static_cast<std::size_t>(std::max(count, 0)))) {
             if (event.data.u64 == wakeTag)
                 resumePaused();
@@ -98,8 +102,11 @@ void UnixLocalPort::accept() {
     const std::lock_guard lock(m_mutex);
     if (!m_name) return;
     Descriptor socket(accept4(m_name->listener(), nullptr, nullptr, SOCK_CLOEXEC | SOCK_NONBLOCK));
-    if (!socket && (errno == EMFILE || errno == ENFILE)) return refuseOne();
-    if (!socket) return;
+    const int error = socket ? 0 : errno;
+    if ((error == EMFILE || error == ENFILE) && refuseOne()) return;
+    if (error == EAGAIN || error == EINTR) return;
+    if (error != 0) return rest(error);
+    m_rests = false;
 
     ucred sender = {};
     socklen_t size = sizeof sender;
@@ -116,11 +123,24 @@ void UnixLocalPort::accept() {
     ++m_tap.counters.connections;
 }
 
-void UnixLocalPort::refuseOne() {
+bool UnixLocalPort::refuseOne() {
     m_spare.reset();
-    Descriptor(accept4(m_name->listener(), nullptr, nullptr, SOCK_CLOEXEC));
-    complain(0, "no descriptor left"); // before the last one is taken again: the log needs it
+    const bool isRefused(Descriptor(accept4(m_name->listener(), nullptr, nullptr, SOCK_CLOEXEC)));
+    if (isRefused) complain(0, "no descriptor left"); // before the last is taken again: the log needs it
     m_spare.reset(::open("/dev/null", O_RDONLY | O_CLOEXEC));
+    return isRefused;
+}
+
+/// The connection that cannot be taken still waits, and the listener would be readable at every turn.
+void UnixLocalPort::rest(int error) {
+    epoll_ctl(m_epoll.get(), EPOLL_CTL_DEL, m_name->listener(), nullptr);
+    if (std::exchange(m_rests, true)) return;
+    Log("IPC: %s: unable to take connections for now: %s\n", m_label.c_str(), std::strerror(error));
+}
+
+void UnixLocalPort::listenAgain() {
+    const std::lock_guard lock(m_mutex);
+    if (m_name) watch(m_name->listener(), listenerTag); // as it may be already
 }
 
 /// What is there now, and little enough for the others to have their turn soon.

@@ -34,7 +34,9 @@ public:
 private:
     bool watch(int descriptor, std::uint64_t tag);
     void accept();
-    void refuseOne();
+    bool refuseOne();
+    void rest(int error);
+    void listenAgain();
     void read(std::uint64_t tag, PacketReader& reader, std::vector<Arrival>& group);
     bool readPacket(const IncomingConnection& connection, PacketReader& reader, IncomingPacket& packet,
                     bool& isOver);
@@ -53,6 +55,7 @@ private:
     Descriptor m_epoll;
     Descriptor m_spare; ///< given up for a moment to refuse a connection when there are no descriptors left
     bool m_canListen = false;
+    bool m_rests = false; ///< since a connection could not be taken
     std::atomic<bool> m_closed = false;
 
     std::mutex m_mutex; ///< guards what follows

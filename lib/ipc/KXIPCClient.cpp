@@ -57,7 +57,7 @@ void KXIPCClient::removeEntries(const KXIPCObserverEntry::Array& entries, const 
 }
 
 void KXIPCClient::postMessage(const KXIPCMessage& message, bool synchronously) {
-    KXIPCCommon::postMessage(message, synchronously);
+    if (!dispatchMessageToLocalListeners(message)) return;
     if (m_isConnected) sendToServer(message, synchronously);
 }
 

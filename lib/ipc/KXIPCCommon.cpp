@@ -72,21 +72,21 @@ std::uint64_t KXIPCCommon::processNumber() const {
 }
 
 void KXIPCCommon::postMessage(const KXIPCMessage& message, bool) {
-    dispatchMessageToLocalListeners(message);
+    std::ignore = dispatchMessageToLocalListeners(message);
 }
 
-void KXIPCCommon::dispatchMessageToLocalListeners(const KXIPCMessage& message) {
+bool KXIPCCommon::dispatchMessageToLocalListeners(const KXIPCMessage& message) {
     std::vector<const void*> tokens;
     tokens.reserve(m_observerTable.size());
     for (const auto& observer : m_observerTable)
         tokens.push_back(observer.token);
-    for (const auto* token : tokens)
-        dispatch(message, token);
+    return std::ranges::all_of(tokens, [&](const auto* token) { return dispatch(message, token); });
 }
 
-void KXIPCCommon::dispatch(const KXIPCMessage& message, const void* token) {
+/// Whether this object is still there afterwards.
+bool KXIPCCommon::dispatch(const KXIPCMessage& message, const void* token) {
     const auto* observer = find(token);
-    if (!observer) return;
+    if (!observer) return true;
     KXIPCObserverEntry::Array matching;
     for (const auto index : message.matchesInObserverArray(observer->entries))
         matching.push_back(observer->entries[index]);
@@ -97,9 +97,13 @@ void KXIPCCommon::dispatch(const KXIPCMessage& message, const void* token) {
         const auto* now = find(token);
         return now && std::ranges::find(now->entries, entry) != now->entries.end();
     };
-    for (const auto& entry : matching)
+    const std::weak_ptr alive = m_alive;
+    for (const auto& entry : matching) {
         if (entry->selector() && isStillThere(entry))
             entry->selector()({*message.name(), message.object(), message.userInfo()});
+        if (alive.expired()) return false;
+    }
+    return true;
 }
 
 void KXIPCCommon::onRemoteMessageReceived(const plist::Value& envelope) {
@@ -107,15 +111,25 @@ void KXIPCCommon::onRemoteMessageReceived(const plist::Value& envelope) {
     const auto message = KXIPCMessage::initWithInfo(envelope["message"]);
     const auto sender = envelope["psnKey"].unsignedLongLongValue();
     const auto messageID = envelope["messageID"].intValue();
+    if (m_lastMessageIDs.size() >= m_mostSenders) forgetEndedSenders();
     auto& lastMessageID = m_lastMessageIDs[sender];
     if (messageID > lastMessageID) {
         lastMessageID = messageID;
-        dispatchMessageToLocalListeners(message);
+        std::ignore = dispatchMessageToLocalListeners(message);
         return;
     }
     if (m_context.ports.mayLogAbout(std::to_string(KXProcessSerialNumberFromNumber(sender).lowLongOfPSN)))
         Log("IPC: %s: dropping duplicate or out of order message\n",
             "-[KXIPCCommon onRemoteMessageReceived:]");
+}
+
+void KXIPCCommon::forgetEndedSenders() {
+    std::erase_if(m_lastMessageIDs, [this](const auto& entry) {
+        const auto process = KXProcessSerialNumberFromNumber(entry.first);
+        return m_context.processes.serialNumberOf(static_cast<int>(process.lowLongOfPSN)) != process;
+    });
+    // Asking costs a few calls of the system for each: so it is done when there are twice as many.
+    m_mostSenders = std::max(m_mostSenders, 2 * m_lastMessageIDs.size());
 }
 
 void KXIPCCommon::terminateWithDelegate(std::function<void()> selector) {

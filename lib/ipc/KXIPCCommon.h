@@ -19,7 +19,8 @@
 /// senders in order of arrival; one whose number is not above its sender's last is logged and dropped.
 /// Observers are called in the order in which they came, and their entries likewise. Observers are tokens,
 /// never dereferenced: remove an observer's entries before it goes away. Only the selector of
-/// `terminateWithDelegate` may destroy the object that calls it.
+/// `terminateWithDelegate` may destroy the object that calls it, also while a message is dispatched. The
+/// last numbers of senders that have ended are forgotten from time to time.
 class KXIPCCommon : public KXIPCMessageReceiverDelegate {
 public:
     explicit KXIPCCommon(KXIPCContext& context);
@@ -51,6 +52,8 @@ public:
 
 protected:
     KXIPCContext& context() const { return m_context; }
+    /// Whether this object is still there afterwards.
+    [[nodiscard]] bool dispatchMessageToLocalListeners(const KXIPCMessage& message);
     /// The entries of all observers, in the order in which observers came.
     KXIPCObserverEntry::Array allEntries() const;
     /// This process in the form in which it travels.
@@ -62,8 +65,8 @@ private:
         KXIPCObserverEntry::Array entries;
     };
     Observer* find(const void* token);
-    void dispatchMessageToLocalListeners(const KXIPCMessage& message);
-    void dispatch(const KXIPCMessage& message, const void* token);
+    bool dispatch(const KXIPCMessage& message, const void* token);
+    void forgetEndedSenders();
 
     KXIPCContext& m_context;
     std::vector<Observer> m_observerTable;                 ///< only ever grows, or is emptied as a whole

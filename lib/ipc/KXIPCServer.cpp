@@ -59,7 +59,7 @@ void KXIPCServer::setAllowIncomingMessages(bool allow) {
 }
 
 void KXIPCServer::postMessage(const KXIPCMessage& message, bool synchronously) {
-    KXIPCCommon::postMessage(message, synchronously);
+    if (!dispatchMessageToLocalListeners(message)) return;
     for (const auto& client : clientsForMessage(message))
         KX_IPC_SendMessageToNamedPort(context(), message, KX_IPC_PortNameForProcess(client.get()),
                                       synchronously);

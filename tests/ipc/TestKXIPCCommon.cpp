@@ -1,4 +1,6 @@
+#include "lib/ipc/KXIPCClient.h"
 #include "lib/ipc/KXIPCCommon.h"
+#include "lib/ipc/KXIPCServer.h"
 #include "tests/ipc/Peer.h"
 
 using testing::ElementsAre;
@@ -27,10 +29,11 @@ struct KXIPCCommonTest : testing::Test {
         common.postMessage(KXIPCMessage("n", std::move(object), plist::Dictionary{{"key", 1}}), true);
         return calls;
     }
-    bool receive(std::int64_t messageID, std::uint32_t sender = 1) {
+    bool receive(std::int64_t messageID, plist::Value sender = 1) {
         calls.clear();
-        common.onRemoteMessageReceived(plist::Dictionary{
-            {"message", plist::Dictionary{{"name", "n"}}}, {"psnKey", sender}, {"messageID", messageID}});
+        common.onRemoteMessageReceived(plist::Dictionary{{"message", plist::Dictionary{{"name", "n"}}},
+                                                         {"psnKey", std::move(sender)},
+                                                         {"messageID", messageID}});
         return !calls.empty();
     }
 
@@ -56,6 +59,12 @@ TEST_F(KXIPCCommonTest, AcceptsOnlyRisingNumbersOfEachSenderWhileReceiving) {
         World::logged(
             "IPC: -[KXIPCCommon onRemoteMessageReceived:]: dropping duplicate or out of order message\n"),
         6);
+
+    EXPECT_TRUE(receive(7, peer.number()));
+    for (std::uint32_t sender = 10; sender < 1100; ++sender)
+        EXPECT_TRUE(receive(1, sender));
+    EXPECT_FALSE(receive(7, peer.number()));
+    EXPECT_TRUE(receive(1)) << "has ended, and is forgotten";
 }
 
 TEST_F(KXIPCCommonTest, CallsEveryMatchingEntryInOrder) {
@@ -88,6 +97,18 @@ TEST_F(KXIPCCommonTest, HandlersMayChangeTheTableWhileAMessageIsDispatched) {
     common.addEntries(entry("b", "n"), &b);
     EXPECT_THAT(post("gone"), ElementsAre("first", "third"));
     EXPECT_THAT(post(), IsEmpty());
+
+    std::unique_ptr<KXIPCCommon> dying;
+    actions["end"] = [&] { dying->terminateWithDelegate([&] { dying.reset(); }); };
+    const auto endWith = [&](std::unique_ptr<KXIPCCommon> object) {
+        dying = std::move(object);
+        for (const auto* observer : {&a, &b})
+            dying->addEntries(entry("end", "n"), observer);
+        dying->postMessage(KXIPCMessage("n", {}, {}), false);
+    };
+    endWith(std::make_unique<KXIPCClient>(peer.context));
+    endWith(std::make_unique<KXIPCServer>(peer.context));
+    EXPECT_THAT(calls, ElementsAre("end", "end"));
 }
 
 TEST_F(KXIPCCommonTest, TellsWhenItHasTerminated) {

@@ -1,6 +1,7 @@
 #include "lib/ipc/KXIPCServer.h"
 
 #include "lib/base/KXNotificationCenter.h"
+#include "lib/base/Log.h"
 #include "lib/ipc/KXIPCCommon.h"
 #include "lib/ipc/KXIPCContext.h"
 #include "lib/ipc/KXIPCMessage.h"
@@ -10,7 +11,9 @@
 #include "lib/kxAppKit/system/KXProcess.h"
 #include "lib/plist/Value.h"
 #include "platform/DistributedNotificationCenter.h"
+#include "platform/MessagePort.h"
 
+#include <cstddef>
 #include <cstdint>
 #include <functional>
 #include <iterator>
@@ -25,6 +28,17 @@ std::optional<std::uint64_t> clientNumber(const KXNotification& notification) {
     const auto number = KXUserInfo(notification)[KX_IPC_PARAM_PSN];
     if (number.type() != plist::Type::integer) return std::nullopt;
     return number.unsignedLongLongValue();
+}
+
+/// What the entries of a table take, counted no further than what a client may have.
+std::size_t weigh(const plist::Value& table) {
+    constexpr std::size_t ofEntry = 256;
+    std::size_t weight = 0;
+    for (std::size_t i = 0; i < table.size() && weight <= KXIPCServer::mostEntryBytes; ++i) {
+        const auto row = table.at(i);
+        weight += ofEntry + row["name"].stringOr("").size() + row["object"].stringOr("").size();
+    }
+    return weight;
 }
 
 } // namespace
@@ -79,11 +93,17 @@ void KXIPCServer::terminateWithDelegate(std::function<void()> selector) {
 
 void KXIPCServer::onAddListener(const KXNotification& notification) {
     const auto number = clientNumber(notification);
+    if (!number) return;
+    const auto weight = weigh(KXUserInfo(notification)[KX_IPC_PARAM_MSG_TABLE]);
+    const auto known = m_clients.find(*number);
+    if (weight + (known == m_clients.end() ? 0 : known->second.weight) > mostEntryBytes)
+        return refuseEntries(*number);
     const auto added = KXIPCObserverEntry::observerEntryTableFromNotification(notification);
-    if (!number || !added) return;
+    if (!added) return;
 
     auto& client = m_clients[*number];
     client.entries.insert(client.entries.end(), added->begin(), added->end());
+    client.weight += weight;
     if (client.process) return;
 
     client.process =
@@ -94,6 +114,13 @@ void KXIPCServer::onAddListener(const KXNotification& notification) {
     confirm(*client.process);
     // Its death came before the watch, so nothing will tell of it.
     if (!client.process->isValid()) removeClient(*number);
+}
+
+void KXIPCServer::refuseEntries(std::uint64_t number) {
+    const auto client = std::to_string(KXProcessSerialNumberFromNumber(number).lowLongOfPSN);
+    if (context().ports.mayLogAbout(client))
+        Log("IPC: %s: dropping entries of process %s, which has too many\n", "-[KXIPCServer onAddListener:]",
+            client.c_str());
 }
 
 void KXIPCServer::confirm(const KXProcess& client) {

@@ -3,6 +3,7 @@
 #include "lib/ipc/KXIPCCommon.h"
 #include "lib/kxAppKit/system/KXProcess.h"
 
+#include <cstddef>
 #include <cstdint>
 #include <map>
 #include <vector>
@@ -12,10 +13,13 @@
 ///
 /// Main thread only. A client is there from its first add message until it says otherwise or its process
 /// ends; each gets its messages in the order of posting. Entries are not compared: those added twice are kept
-/// twice. A message to a client that no longer listens is logged and lost, and the client stays until its end
-/// is known.
+/// twice. An add message that takes a client's entries past `mostEntryBytes`, each counted as its two strings
+/// and 256 bytes, is logged and dropped as a whole. A message to a client that no longer listens is logged
+/// and lost, and the client stays until its end is known.
 class KXIPCServer : public KXIPCCommon {
 public:
+    static constexpr std::size_t mostEntryBytes = std::size_t{16} << 20;
+
     explicit KXIPCServer(KXIPCContext& context);
     ~KXIPCServer() override;
     KXIPCServer(const KXIPCServer&) = delete;
@@ -35,9 +39,11 @@ private:
     struct Client {
         KXIPCObserverEntry::Array entries;
         KXProcess::Pointer process;
+        std::size_t weight = 0; ///< of the entries
     };
     void onAddListener(const KXNotification& notification);
     void onRemoveListener(const KXNotification& notification);
+    void refuseEntries(std::uint64_t number);
     void removeClient(std::uint64_t number);
     void removeAllClients();
     void confirm(const KXProcess& client);

@@ -122,6 +122,11 @@ TEST_F(KXIPCClientServerTest, NobodyIsAddedWithoutANameOrTakenAwayByAnother) {
         << "dead";
     EXPECT_EQ(clientsAfterAdd({{KX_IPC_PARAM_MSG_TABLE, table}, {KX_IPC_PARAM_PSN, clientPeer.number()}}),
               1U);
+    for (const std::size_t size : {9, 9, 20}) { // MiB; not more than 16 together
+        const Value large = plist::Array{Dictionary{{"name", std::string(size << 20, 'x')}}};
+        clientsAfterAdd({{KX_IPC_PARAM_MSG_TABLE, large}, {KX_IPC_PARAM_PSN, clientPeer.number()}});
+    }
+    EXPECT_EQ(World::logged("dropping entries of process 3000, which has too many\n"), 2);
 
     const Value all = Dictionary{{KX_IPC_PARAM_ALL_MESSAGES, true}, {KX_IPC_PARAM_PSN, clientPeer.number()}};
     server->addEntries(entry("after"), this);

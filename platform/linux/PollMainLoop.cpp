@@ -9,6 +9,7 @@
 #include <climits>
 #include <cstddef>
 #include <cstdint>
+#include <deque>
 #include <functional>
 #include <iterator>
 #include <map>
@@ -170,20 +171,21 @@ bool PollMainLoop::turn(Milliseconds patience) {
     const auto dead = [](const auto& entry) { return !entry->live; };
     std::erase_if(m_timers, dead);
     std::erase_if(m_watches, dead);
-    std::vector<Task> tasks;
-    {
-        std::lock_guard lock(m_mutex);
-        tasks.swap(m_posted);
-        m_isAwake = !tasks.empty();
-    }
-    const bool read = runReadable(tasks.empty() ? patience : Milliseconds::zero());
-    if (tasks.empty()) {
-        std::lock_guard lock(m_mutex);
-        tasks.swap(m_posted);
-        m_isAwake = true;
-    }
+    collect(true);
+    const bool mayWait = m_ready.empty();
+    const bool read = runReadable(mayWait ? patience : Milliseconds::zero());
+    if (mayWait) collect(false);
     const bool timed = runTimers();
-    return runPosted(tasks) || timed || read;
+    return runReady() || timed || read;
+}
+
+/// `waits`: before the next look at what is posted, unless there is something now.
+void PollMainLoop::collect(bool waits) {
+    const std::lock_guard lock(m_mutex);
+    if (m_ready.empty()) m_ready.swap(m_posted);
+    std::ranges::move(m_posted, std::back_inserter(m_ready));
+    m_posted.clear();
+    m_isAwake = !waits || !m_ready.empty();
 }
 
 std::optional<Clock::Instant> PollMainLoop::nextTimer() const {
@@ -239,10 +241,14 @@ bool PollMainLoop::runTimers() {
     return ran;
 }
 
-bool PollMainLoop::runPosted(std::vector<Task>& tasks) {
-    for (auto& task : tasks)
-        std::exchange(task, nullptr)();
-    return !tasks.empty();
+bool PollMainLoop::runReady() {
+    const bool ran = !m_ready.empty();
+    while (!m_ready.empty()) { // a task that turns the loop has the rest run there
+        const auto task = std::move(m_ready.front());
+        m_ready.pop_front();
+        task();
+    }
+    return ran;
 }
 
 } // namespace platform

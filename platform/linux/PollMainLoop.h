@@ -5,6 +5,7 @@
 #include "platform/linux/Descriptor.h"
 
 #include <atomic>
+#include <deque>
 #include <mutex>
 #include <optional>
 #include <vector>
@@ -47,16 +48,18 @@ private:
     int pollTimeout(Milliseconds patience) const;
     bool runReadable(Milliseconds patience);
     bool runTimers();
-    bool runPosted(std::vector<Task>& tasks);
+    void collect(bool waits);
+    bool runReady();
 
     const Clock& m_clock;
     Descriptor m_wake;
     std::shared_ptr<Poll> m_poll; ///< handles may outlive the loop
     std::vector<std::shared_ptr<Timer>> m_timers;
     std::vector<std::shared_ptr<Watch>> m_watches;
+    std::deque<Task> m_ready; ///< posted before the innermost turn under way, which runs them all
     std::mutex m_mutex;
-    std::vector<Task> m_posted; ///< guarded by m_mutex
-    bool m_isAwake = true;      ///< guarded by m_mutex; will look at what is posted before it waits
+    std::deque<Task> m_posted; ///< guarded by m_mutex
+    bool m_isAwake = true;     ///< guarded by m_mutex; will look at what is posted before it waits
     std::atomic<bool> m_quit = false;
 };
 

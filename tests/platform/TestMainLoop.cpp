@@ -52,6 +52,7 @@ TYPED_TEST(MainLoopContract, runsWhatAnyThreadPostsLaterInOrderAndStarvesNothing
     loop.post([&] {
         loop.post([&] { called.push_back(3); });
         called.push_back(1);
+        EXPECT_TRUE(world.runUntil([&] { return called.size() == 3; })) << "turned from inside";
     });
     std::thread([&] { loop.post([&] { called.push_back(2); }); }).join();
     EXPECT_TRUE(called.empty());

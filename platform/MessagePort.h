@@ -5,6 +5,7 @@
 
 #include <chrono>
 #include <cstddef>
+#include <cstdint>
 #include <functional>
 #include <memory>
 #include <span>
@@ -100,6 +101,14 @@ public:
     /// one that was there for `isListening` is gone when we connect.
     using HangUpHandler = std::function<void(const std::string& name)>;
     virtual void setHangUpHandler(HangUpHandler handler) = 0;
+
+    /// How many messages still wait here for their receivers, and how many were given up, all of them sent
+    /// asynchronously. Any thread.
+    struct Queued {
+        std::uint64_t waiting = 0;
+        std::uint64_t dropped = 0;
+    };
+    virtual Queued queued() const = 0;
 
     /// Whether one more log entry about a peer may be written, ten a minute in all; counts it if so. A peer
     /// is a process id in digits, or the name of a port that is sent to. Any thread.

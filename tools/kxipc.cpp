@@ -1,6 +1,7 @@
 #include "lib/base/Log.h"
 #include "lib/ipc/KXIPCContext.h"
 #include "lib/ipc/KXIPCNames.h"
+#include "platform/MessagePort.h"
 #include "platform/PortWatch.h"
 #include "platform/linux/LinuxPorts.h"
 #include "platform/linux/PollMainLoop.h"
@@ -64,6 +65,7 @@ int watch(System& system, const KxipcArguments& arguments) {
     };
     const auto record = [&](const platform::PassingMessage& message, double seconds) {
         KxipcRecord(file, message, seconds);
+        if (!file) end();
     };
     const bool isRecord = arguments.command == Command::record;
     const auto port = portOf(arguments, isRecord ? 1 : 0);
@@ -86,10 +88,18 @@ int replay(System& system, const KxipcArguments& arguments) {
     auto messages = KxipcReadRecording(file, port == KX_IPC_ServerPortName());
     if (!messages) return fail(arguments.names[0] + ": no recording");
     if (!system.context.ports.isListening(port)) return fail("nobody listens on " + port);
-    KxipcReplay replay(system.context, std::move(*messages), port, [&] { system.loop.quit(); });
+    const auto end = [&] { system.loop.quit(); };
+    bool hasHungUp = false;
+    system.context.ports.setHangUpHandler([&](const std::string&) {
+        hasHungUp = true;
+        end();
+    });
+    KxipcReplay replay(system.context, std::move(*messages), port, end);
     replay.start(arguments.speed);
     system.loop.run();
-    return 0;
+    if (hasHungUp) return fail(port + " was closed");
+    const auto dropped = system.context.ports.queued().dropped;
+    return dropped > 0 ? fail(std::to_string(dropped) + " messages were dropped") : 0;
 }
 
 int run(const KxipcArguments& arguments) {

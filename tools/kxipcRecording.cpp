@@ -7,6 +7,8 @@
 #include "lib/kxAppKit/system/KXProcess.h"
 #include "lib/plist/Binary.h"
 #include "lib/plist/Value.h"
+#include "platform/MainLoop.h"
+#include "platform/MessagePort.h"
 #include "platform/PortWatch.h"
 
 #include <algorithm>
@@ -100,10 +102,15 @@ KxipcReplay::KxipcReplay(KXIPCContext& context, std::vector<KxipcRecordedMessage
 
 void KxipcReplay::start(double speed) {
     m_speed = speed;
-    m_timer = m_context.mainLoop.startTimer({}, {}, [this] { sendNext(); });
+    sendAfter({});
+}
+
+void KxipcReplay::sendAfter(platform::MainLoop::Milliseconds pause) {
+    m_timer = m_context.mainLoop.startTimer(pause, {}, [this] { sendNext(); });
 }
 
 void KxipcReplay::sendNext() {
+    if (m_context.ports.queued().waiting > 0) return sendAfter(std::chrono::milliseconds(1));
     if (m_next == m_messages.size()) return m_onEnd();
     const auto& [seconds, message, synchronous] = m_messages[m_next];
     const auto self = m_context.processes.currentProcess().value_or(ProcessSerialNumber{});
@@ -115,6 +122,5 @@ void KxipcReplay::sendNext() {
     if (m_speed > 0 && m_next < m_messages.size()) pause = (m_messages[m_next].seconds - seconds) / m_speed;
     // A recording may claim any times, what is no number too; none is waited for longer than a day.
     const auto milliseconds = static_cast<std::int64_t>(pause > 0 ? std::min(pause, 86'400.0) * 1000 : 0);
-    m_timer =
-        m_context.mainLoop.startTimer(std::chrono::milliseconds(milliseconds), {}, [this] { sendNext(); });
+    sendAfter(std::chrono::milliseconds(milliseconds));
 }

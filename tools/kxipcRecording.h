@@ -27,10 +27,11 @@ struct KxipcRecordedMessage {
 std::optional<std::vector<KxipcRecordedMessage>> KxipcReadRecording(std::istream& file, bool toServer);
 
 /// Sends recorded messages again, as this process's own: with its number, in the envelope and in control
-/// messages, and its message counter.
+/// messages, and its message counter. None is sent while an earlier one still waits for the receiver, so none
+/// is dropped for want of room.
 class KxipcReplay {
 public:
-    /// All must outlive it. `onEnd` is called from the main loop after the last.
+    /// All must outlive it. `onEnd` is called from the main loop once the last is on its way.
     KxipcReplay(KXIPCContext& context, std::vector<KxipcRecordedMessage> messages, std::string port,
                 std::function<void()> onEnd);
     /// `speed` 0 is without pauses.
@@ -38,6 +39,7 @@ public:
 
 private:
     void sendNext();
+    void sendAfter(platform::MainLoop::Milliseconds pause);
 
     KXIPCContext& m_context;
     const std::vector<KxipcRecordedMessage> m_messages;

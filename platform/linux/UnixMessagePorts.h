@@ -27,6 +27,7 @@ public:
     bool isListening(const std::string& name) override;
     std::vector<std::string> listeningNames() override;
     void setHangUpHandler(HangUpHandler handler) override { m_hangUpHandler = std::move(handler); }
+    Queued queued() const override { return {m_tap.counters.queued, m_tap.counters.dropped}; }
     bool mayLogAbout(const std::string& peer) override { return m_logLimit.allows(peer, m_clock.now()); }
 
 private:

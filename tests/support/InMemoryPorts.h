@@ -23,11 +23,14 @@ public:
     /// All must outlive it, but for what is still posted to the loop.
     InMemoryPorts(InMemoryPortNetwork& network, platform::MainLoop& mainLoop, platform::PortPeer self);
 
+    Queued queue; ///< what is said of it; nothing really waits
+
     std::unique_ptr<platform::LocalPort> open(const std::string& name) override;
     std::unique_ptr<platform::RemotePort> connect(const std::string& name) override;
     bool isListening(const std::string& name) override;
     std::vector<std::string> listeningNames() override;
     void setHangUpHandler(HangUpHandler handler) override { m_hangUpHandler = std::move(handler); }
+    Queued queued() const override { return queue; }
     bool mayLogAbout(const std::string& peer) override { return m_logLimit.allows(peer, {}); }
 
 private:

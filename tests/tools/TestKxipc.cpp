@@ -85,6 +85,10 @@ TEST(KxipcReplay, SendsAsItselfAtTheTimesOfTheRecording) {
     replay.start(2);
     world.loop.advance(std::chrono::milliseconds(1499));
     EXPECT_EQ(peer.context.messageCounter, 1);
+    peer.ports.queue.waiting = 1;
+    world.loop.advance(std::chrono::milliseconds(100));
+    EXPECT_EQ(peer.context.messageCounter, 1) << "the first still waits for its receiver";
+    peer.ports.queue.waiting = 0;
     world.loop.advance(std::chrono::milliseconds(1));
     ASSERT_TRUE(isOver && world.loop.runUntil([&] { return told.noted.size() == 3; }));
     EXPECT_THAT(told.noted, testing::ElementsAre(1, 2, 3));

@@ -3,6 +3,7 @@
 
 import os
 import plistlib
+import resource
 import signal
 import subprocess
 import tempfile
@@ -27,7 +28,7 @@ class Kxipc(unittest.TestCase):
 
     def start(self, program, *arguments):
         process = subprocess.Popen([f"{os.environ['KX_TEST_BIN']}/{program}", *arguments], stdout=subprocess.PIPE,
-                                   text=True)
+                                   text=True, restore_signals=False)
         self.addCleanup(self.end, process, signal.SIGKILL)
         return process
 
@@ -91,6 +92,10 @@ class Kxipc(unittest.TestCase):
         recorder = self.start("kxipc", "record", self.recording)
         self.post_until(lambda: os.path.exists(self.recording) and os.path.getsize(self.recording) > 200)
         self.assertEqual(self.end(recorder, signal.SIGTERM), 0)
+        recorder = self.start("kxipc", "record", self.recording + ".cut")
+        resource.prlimit(recorder.pid, resource.RLIMIT_FSIZE, (200, 200))
+        self.post_until(lambda: recorder.poll() is not None)
+        self.assertEqual(recorder.returncode, 1, "ends at the first that cannot be written")
 
         watch = self.start("kxipc", "watch", "--json")
         seen = threading.Event()

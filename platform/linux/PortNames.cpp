@@ -15,6 +15,7 @@
 #include <string>
 #include <sys/file.h>
 #include <sys/socket.h>
+#include <sys/stat.h>
 #include <sys/un.h>
 #include <unistd.h>
 #include <utility>
@@ -39,6 +40,12 @@ int BindOrConnect(Addressing function, const Descriptor& socket, const std::stri
     }
     std::memcpy(address.sun_path, path.data(), path.size());
     return function(socket.get(), reinterpret_cast<const sockaddr*>(&address), sizeof address);
+}
+
+/// Whoever came between opening and locking it may have removed it, and the next one makes another.
+bool IsRemoved(int file) {
+    struct stat status = {};
+    return fstat(file, &status) != 0 || status.st_nlink == 0;
 }
 
 /// A listening socket that has the name, put there whole: who connects meets the old owner's or this one.
@@ -87,7 +94,7 @@ std::optional<OwnedName> PortNames::take(const std::string& name) const {
     RemoveLeftovers(m_directory->get());
     constexpr int flags = O_RDWR | O_CREAT | O_CLOEXEC | O_NOFOLLOW | O_NONBLOCK;
     Descriptor lock(openat(m_directory->get(), (name + ".lock").c_str(), flags, S_IRUSR | S_IWUSR));
-    if (!lock || flock(lock.get(), LOCK_EX | LOCK_NB) != 0) return std::nullopt;
+    if (!lock || flock(lock.get(), LOCK_EX | LOCK_NB) != 0 || IsRemoved(lock.get())) return std::nullopt;
     auto listener = Listen(m_directory->get(), name);
     if (!listener) return std::nullopt;
     return OwnedName(m_directory, name, std::move(lock), std::move(listener));

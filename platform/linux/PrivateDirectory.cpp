@@ -8,6 +8,7 @@
 #include <cstring>
 #include <fcntl.h>
 #include <string>
+#include <sys/file.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
@@ -53,6 +54,7 @@ Descriptor OpenPrivateDirectory(int at, const std::string& path) {
             path.c_str());
         return {};
     }
+    flock(directory.get(), LOCK_SH | LOCK_NB); // whoever cleans /tmp may leave it alone for that
     return directory;
 }
 

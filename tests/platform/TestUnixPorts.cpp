@@ -5,6 +5,7 @@
 
 #include <future>
 #include <gmock/gmock.h>
+#include <sys/file.h>
 #include <sys/resource.h>
 #include <sys/stat.h>
 
@@ -57,6 +58,8 @@ TEST_F(UnixPorts, useADirectoryThatIsTheUsersAlone) {
     struct stat status = {};
     ASSERT_EQ(stat(directory.c_str(), &status), 0);
     EXPECT_EQ(status.st_mode & 07777, 0700U);
+    const Descriptor cleaner(open(directory.c_str(), O_RDONLY | O_CLOEXEC));
+    EXPECT_NE(flock(cleaner.get(), LOCK_EX | LOCK_NB), 0);
 
     setenv("XDG_RUNTIME_DIR", "/some/where", 1);
     EXPECT_EQ(DefaultPortDirectory(), "/some/where/com.corvane.kxipc");

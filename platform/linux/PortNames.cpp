@@ -64,6 +64,15 @@ Descriptor Listen(int directory, const std::string& name) {
     return {};
 }
 
+/// The same under a higher number. The system closes a killed process's descriptors from the highest down,
+/// and takes up to seconds for one of inotify: for so long its name would still be taken, and who connects be
+/// let in.
+Descriptor Raised(Descriptor low) {
+    constexpr int aboveMostOthers = 512;
+    Descriptor high(fcntl(low.get(), F_DUPFD_CLOEXEC, aboveMostOthers));
+    return high ? std::move(high) : std::move(low);
+}
+
 } // namespace
 
 void WidenSendBuffer(int socket) {
@@ -97,7 +106,7 @@ std::optional<OwnedName> PortNames::take(const std::string& name) const {
     if (!lock || flock(lock.get(), LOCK_EX | LOCK_NB) != 0 || IsRemoved(lock.get())) return std::nullopt;
     auto listener = Listen(m_directory->get(), name);
     if (!listener) return std::nullopt;
-    return OwnedName(m_directory, name, std::move(lock), std::move(listener));
+    return OwnedName(m_directory, name, Raised(std::move(lock)), Raised(std::move(listener)));
 }
 
 PortNames::Connecting PortNames::connect(const std::string& name, Descriptor& socket) const {

@@ -4,9 +4,10 @@
 #include "lib/plist/Binary.h"
 #include "platform/linux/ProcProcessTable.h"
 #include "tests/platform/PortWorlds.h"
-#include "tests/platform/RawPeer.h"
+#include "tests/support/RawPeer.h"
 
 #include <cstddef>
+#include <gtest/gtest.h>
 
 // Small messages, cut short everywhere and changed everywhere, over a real socket into a server's observers.
 
@@ -32,6 +33,15 @@ struct HostilePackets : testing::Test {
         const auto bytes = plist::WriteBinary(KXIPCEnvelope(message, sender, 1, false), error).joined();
         return {reinterpret_cast<const char*>(bytes.data()), bytes.size()};
     }
+    static std::string bytesOfControl(const char* name, platform::ProcessSerialNumber claimed,
+                                      platform::ProcessSerialNumber sender) {
+        return bytesOf(
+            {name,
+             {},
+             plist::Dictionary{{KX_IPC_PARAM_MSG_TABLE, plist::Array{plist::Dictionary{{"name", "m"}}}},
+                               {KX_IPC_PARAM_PSN, KXNumberFromProcessSerialNumber(claimed)}}},
+            sender);
+    }
     static std::string packetOf(const std::string& payload) {
         return RawHeader({.payloadLength = payload.size()}) + payload;
     }
@@ -40,8 +50,8 @@ struct HostilePackets : testing::Test {
     bool survives(const std::vector<std::string>& packets) {
         constexpr PacketHeader last{.flags = PacketHeader::wantsAnswer, .sequence = 99};
         for (const auto& packet : packets)
-            peer->trySend(packet);
-        peer->trySend(RawHeader(last));
+            peer->trySend({.bytes = packet});
+        peer->trySend({.bytes = RawHeader(last)});
         PacketHeader answer;
         ssize_t length = 0;
         do
@@ -78,14 +88,8 @@ struct HostilePackets : testing::Test {
 
 TEST_F(HostilePackets, EveryCutAndEveryChangeOfAByteIsDroppedOrUnderstood) {
     const auto self = *processes.currentProcess();
-    const auto number = KXNumberFromProcessSerialNumber(self);
-    const std::string payloads[] = {
-        bytesOf(KXIPCMessage("n", {}, {}), self),
-        bytesOf(KXIPCMessage(KX_IPC_ADD_LISTENER_NOTIFICATION, {},
-                             plist::Dictionary{
-                                 {KX_IPC_PARAM_MSG_TABLE, plist::Array{plist::Dictionary{{"name", "m"}}}},
-                                 {KX_IPC_PARAM_PSN, number}}),
-                self)};
+    const std::string payloads[] = {bytesOf(KXIPCMessage("n", {}, {}), self),
+                                    bytesOfControl(KX_IPC_ADD_LISTENER_NOTIFICATION, self, self)};
     for (const auto& payload : payloads) {
         const auto packet = packetOf(payload);
         for (std::size_t size = 0; size < packet.size(); ++size)
@@ -110,6 +114,21 @@ TEST_F(HostilePackets, EveryCutAndEveryChangeOfAByteIsDroppedOrUnderstood) {
     EXPECT_EQ(ScratchHome::logged("IPC: ") - ScratchHome::logged("unable to create port"), 10)
         << "in a minute";
     EXPECT_EQ(ScratchHome::logged("unable to create port"), 10) << "to confirm to";
+}
+
+TEST_F(HostilePackets, WhatClaimsToBeAnothersCostsAnEntryEach) {
+    const auto self = *processes.currentProcess(), parent = *platform::SerialNumberOfPeer(getppid());
+    const std::string payloads[] = {bytesOf(KXIPCMessage("n", {}, {}), parent),
+                                    bytesOfControl(KX_IPC_ADD_LISTENER_NOTIFICATION, parent, parent),
+                                    bytesOfControl(KX_IPC_ADD_LISTENER_NOTIFICATION, parent, self),
+                                    bytesOfControl(KX_IPC_REMOVE_LISTENER_NOTIFICATION, parent, self)};
+    int entries = 0;
+    for (const auto& payload : payloads) {
+        EXPECT_TRUE(survives({packetOf(payload)}));
+        EXPECT_EQ(ScratchHome::logged("sent in another's name"), ++entries);
+    }
+    EXPECT_EQ(dispatched, 0);
+    EXPECT_TRUE(server->clientsForMessage(KXIPCMessage("m", {}, {})).empty());
 }
 
 } // namespace

@@ -56,19 +56,13 @@ TEST(KXIPCEnvelope, IsCheckedForItsFormAndForItsSender) {
         EXPECT_NE(KXIPCEnvelopeError(envelope), "") << envelope.description();
 
     const platform::ProcessSerialNumber self{7, 42}, reused{8, 42}, stranger{7, 43};
-    const auto isFrom = [&](platform::ProcessSerialNumber named, const char* name,
-                            platform::ProcessSerialNumber controlNumber, const platform::PortPeer& sender) {
-        const Value number = KXNumberFromProcessSerialNumber(controlNumber);
-        const KXIPCMessage sent(name, {}, Dictionary{{KX_IPC_PARAM_PSN, number}});
-        return KXIPCEnvelopeIsFrom(KXIPCEnvelope(sent, named, 1, false), sender);
+    const auto isFrom = [&](platform::ProcessSerialNumber named, const platform::PortPeer& sender) {
+        return KXIPCEnvelopeIsFrom(KXIPCEnvelope(KXIPCMessage("n", {}, {}), named, 1, false), sender);
     };
-    EXPECT_TRUE(isFrom(self, "n", stranger, {42, self}));
-    EXPECT_FALSE(isFrom(reused, "n", self, {42, self}));
-    EXPECT_TRUE(isFrom(reused, "n", self, {42, {}}))
-        << "of a sender that has ended only the process id is known";
-    EXPECT_FALSE(isFrom(stranger, "n", self, {42, {}}));
-    EXPECT_TRUE(isFrom(self, KX_IPC_REMOVE_LISTENER_NOTIFICATION, self, {42, self}));
-    EXPECT_FALSE(isFrom(self, KX_IPC_REMOVE_LISTENER_NOTIFICATION, stranger, {42, self}));
+    EXPECT_TRUE(isFrom(self, {42, self}));
+    EXPECT_FALSE(isFrom(reused, {42, self}));
+    EXPECT_TRUE(isFrom(reused, {42, {}})) << "of a sender that has ended only the process id is known";
+    EXPECT_FALSE(isFrom(stranger, {42, {}}));
 }
 
 TEST(KXIPCSend, EverySendUsesUpTheNextNumberWhateverBecomesOfIt) {

@@ -2,7 +2,7 @@
 
 #include "lib/plist/Binary.h"
 #include "tests/platform/PortWorlds.h"
-#include "tests/platform/RawPeer.h"
+#include "tests/support/RawPeer.h"
 
 #include <array>
 #include <gmock/gmock.h>

@@ -1,7 +1,7 @@
 #include "platform/linux/PrivateDirectory.h"
 #include "tests/platform/Child.h"
 #include "tests/platform/PortWorlds.h"
-#include "tests/platform/RawPeer.h"
+#include "tests/support/RawPeer.h"
 
 #include <future>
 #include <gmock/gmock.h>
@@ -137,16 +137,6 @@ TEST_F(UnixPorts, neverBlockAnAsynchronousSenderAndKeepOrder) {
     EXPECT_LE(OpenDescriptors(), descriptors + 1) << "one for the sender's thread";
 }
 
-TEST_F(UnixPorts, dropAtTheSenderWhatIsOverdueAndSayItOnce) {
-    const auto port = server.open(name);
-    const auto remote = client.connect(name);
-    for (int i = 0; i < 201; ++i) {
-        if (i % 100 == 0) clock.advance(21s);
-        Send(*remote, std::string(10'000, 'x'));
-    }
-    EXPECT_EQ(ScratchHome::logged("dropping messages to " + name), 1);
-}
-
 TEST_F(UnixPorts, sendWhatIsQueuedBeforeTheyEnd) {
     std::optional<UnixMessagePorts> sender(std::in_place, loop, clock, directory);
     const auto port = server.open(name);
@@ -201,6 +191,24 @@ TEST_F(UnixPorts, cutOffPeersThatSendWhatIsNoPacket) {
     EXPECT_LE(OpenDescriptors(), descriptors + 5) << "peers' ends, one of them already closed";
     listener.close();
     EXPECT_TRUE(silent.isCutOff());
+}
+
+TEST_F(UnixPorts, takeNoMemoryThatCouldShrinkOrHas) {
+    const auto port = server.open(name);
+    const auto shrinks = [&](RawPeer& peer, int seals, int later) {
+        const auto memory = Memory("payload", seals);
+        peer.send({{}, RawHeader({.flags = PacketHeader::inMemory, .payloadLength = 7}), {memory}});
+        const bool shrank = ftruncate(memory->get(), 0) == 0;
+        return fcntl(memory->get(), F_ADD_SEALS, later) == 0 && shrank;
+    };
+    RawPeer open(directory, name), sealedLate(directory, name), sealed(directory, name);
+    EXPECT_TRUE(shrinks(open, 0, 0));
+    EXPECT_TRUE(shrinks(sealedLate, 0, allSeals));
+    auto reading = std::async(std::launch::async, Read, std::ref(*port), 1);
+    EXPECT_TRUE(open.isCutOff() && sealedLate.isCutOff());
+    EXPECT_EQ(ScratchHome::logged("memory that is not sealed or not of the announced size"), 2);
+    EXPECT_FALSE(shrinks(sealed, allSeals, 0)) << "so what is there when it is mapped is there to be read";
+    EXPECT_EQ(reading.get(), std::vector<std::string>{"payload"});
 }
 
 TEST_F(UnixPorts, cutOffWhomTheyHaveNoDescriptorFor) {

@@ -1,6 +1,6 @@
 #pragma once
 
-#include "lib/ipc/KXIPCContext.h"
+#include "lib/ipc/KXIPCServer.h"
 #include "platform/linux/LinuxPorts.h"
 #include "platform/linux/PollMainLoop.h"
 #include "platform/linux/ProcProcessTable.h"
@@ -31,6 +31,11 @@ struct Program {
         : system(loop, directory)
         , context{system.ports(), system.notifications(), loop, processes, "com.corvane.test"} {}
 };
+
+inline void Observe(KXIPCCommon& common, const char* name, KXIPCObserverEntry::Selector selector) {
+    const KXIPCObserverEntryRow row{name, std::move(selector), {}};
+    common.addEntries(KXIPCObserverEntryArray(&row, 1), &common);
+}
 
 /// How long it took until the condition held, as seen every tenth of a millisecond; gives up after ten
 /// seconds.

@@ -17,3 +17,12 @@ inline std::size_t MappedMessages(pid_t process) {
     }
     return sum;
 }
+
+/// That, looked at or not, and the anonymous memory that it has in use.
+inline std::size_t HeldMemory(pid_t process) {
+    std::ifstream status("/proc/" + std::to_string(process) + "/status");
+    for (std::string line; std::getline(status, line);)
+        if (line.starts_with("RssAnon:"))
+            return MappedMessages(process) + 1024 * std::strtoull(line.c_str() + 8, nullptr, 10);
+    return 0;
+}

@@ -2,20 +2,43 @@
 
 #include "platform/linux/PortPacket.h"
 
+#include <cerrno>
+#include <cstring>
 #include <fcntl.h>
-#include <gtest/gtest.h>
+#include <memory>
 #include <poll.h>
 #include <string>
 #include <sys/mman.h>
 #include <sys/un.h>
+#include <system_error>
+#include <unistd.h>
 #include <vector>
 
 /// What a peer may send, byte for byte.
 struct RawPacket {
-    std::string what;
-    std::string bytes;
+    std::string what{};
+    std::string bytes{};
     std::vector<std::shared_ptr<platform::Descriptor>> descriptors{};
 };
+
+inline std::string RawHeader(platform::PacketHeader header) {
+    return {reinterpret_cast<const char*>(&header), sizeof header};
+}
+
+constexpr int allSeals = F_SEAL_SEAL | F_SEAL_SHRINK | F_SEAL_GROW | F_SEAL_WRITE;
+
+/// What cannot be done throws, here and below.
+inline void Require(bool success, const char* what) {
+    if (!success) throw std::system_error(errno, std::generic_category(), what);
+}
+
+inline std::shared_ptr<platform::Descriptor> Memory(const std::string& contents, int seals) {
+    auto memory =
+        std::make_shared<platform::Descriptor>(memfd_create("test", MFD_CLOEXEC | MFD_ALLOW_SEALING));
+    Require(write(memory->get(), contents.data(), contents.size()) >= 0, "write");
+    Require(fcntl(memory->get(), F_ADD_SEALS, seals) == 0, "seal");
+    return memory;
+}
 
 /// A peer without the library.
 class RawPeer {
@@ -27,10 +50,14 @@ public:
         sockaddr_un address = {};
         address.sun_family = AF_UNIX;
         (directory + '/' + name).copy(address.sun_path, sizeof address.sun_path - 1);
-        EXPECT_EQ(connect(m_socket.get(), reinterpret_cast<const sockaddr*>(&address), sizeof address), 0);
+        Require(connect(m_socket.get(), reinterpret_cast<const sockaddr*>(&address), sizeof address) == 0,
+                "connect");
     }
 
-    void send(const RawPacket& packet) {
+    void send(const RawPacket& packet) { Require(trySend(packet), "send"); }
+
+    /// The connection may be gone by now.
+    bool trySend(const RawPacket& packet) {
         auto bytes = packet.bytes;
         iovec vector{bytes.data(), bytes.size()};
         msghdr message = {};
@@ -47,13 +74,9 @@ public:
             *rights = {CMSG_LEN(numbers.size() * sizeof(int)), SOL_SOCKET, SCM_RIGHTS};
             std::memcpy(CMSG_DATA(rights), numbers.data(), numbers.size() * sizeof(int));
         }
-        EXPECT_EQ(sendmsg(m_socket.get(), &message, MSG_NOSIGNAL), static_cast<ssize_t>(bytes.size()));
+        return sendmsg(m_socket.get(), &message, MSG_NOSIGNAL) >= 0;
     }
 
-    /// The connection may be gone by now.
-    void trySend(const std::string& bytes) {
-        ::send(m_socket.get(), bytes.data(), bytes.size(), MSG_NOSIGNAL);
-    }
     /// Like recv, waiting.
     ssize_t receive(void* to, std::size_t size) { return recv(m_socket.get(), to, size, 0); }
 
@@ -68,20 +91,6 @@ private:
     platform::Descriptor m_socket;
 };
 
-inline std::string RawHeader(platform::PacketHeader header) {
-    return {reinterpret_cast<const char*>(&header), sizeof header};
-}
-
-inline std::shared_ptr<platform::Descriptor> Memory(const std::string& contents, int seals) {
-    auto memory =
-        std::make_shared<platform::Descriptor>(memfd_create("test", MFD_CLOEXEC | MFD_ALLOW_SEALING));
-    EXPECT_EQ(write(memory->get(), contents.data(), contents.size()), static_cast<ssize_t>(contents.size()));
-    EXPECT_EQ(fcntl(memory->get(), F_ADD_SEALS, seals), 0);
-    return memory;
-}
-
-constexpr int allSeals = F_SEAL_SEAL | F_SEAL_SHRINK | F_SEAL_GROW | F_SEAL_WRITE;
-
 inline std::vector<RawPacket> GoodPackets() {
     const auto header = RawHeader({.flags = platform::PacketHeader::inMemory, .payloadLength = 7});
     return {{"inline", RawHeader({.payloadLength = 7}) + "payload"},
@@ -95,13 +104,13 @@ inline std::vector<RawPacket> BadPackets() {
     const auto sealed = Memory("payload", allSeals);
     const auto file = std::make_shared<Descriptor>(open("/proc/self/exe", O_RDONLY | O_CLOEXEC));
     int pipeEnds[2];
-    EXPECT_EQ(pipe2(pipeEnds, O_CLOEXEC), 0);
+    Require(pipe2(pipeEnds, O_CLOEXEC) == 0, "pipe");
     const auto pipe = std::make_shared<Descriptor>(pipeEnds[0]);
     const Descriptor otherEnd(pipeEnds[1]);
     const auto sparse = [](const char* what, std::size_t size) {
         const auto memory = Memory("", 0);
-        EXPECT_EQ(ftruncate(memory->get(), static_cast<off_t>(size)), 0);
-        EXPECT_EQ(fcntl(memory->get(), F_ADD_SEALS, allSeals), 0);
+        Require(ftruncate(memory->get(), static_cast<off_t>(size)) == 0, "enlarge");
+        Require(fcntl(memory->get(), F_ADD_SEALS, allSeals) == 0, "seal");
         return RawPacket{what, RawHeader({.flags = inMemory, .payloadLength = size}), {memory}};
     };
     const auto memoryHeader = RawHeader({.flags = inMemory, .payloadLength = 7});

@@ -9,7 +9,7 @@ import subprocess
 import tempfile
 import unittest
 
-from desktop import Program, Window, press, type_text, wait_until
+from desktop import Program, Window, end, press, start, type_text, wait_until
 from peer import SERVER, Peer, process_number
 
 
@@ -63,6 +63,31 @@ class PythonPeer(unittest.TestCase):
         press("Return")
         info, _ = server.wait_for("menu.onAction")
         self.assertEqual(info, {"action": "run", "tag": -3, "representedObject": {"of": ["ours", 7]}})
+        self.check_recording(server, port)
+
+    def check_recording(self, server, port):
+        """What the agent gets can be watched, recorded, and sent to it again."""
+        tool = os.path.join(os.environ["KX_TEST_BIN"], "kxipc")
+        recording, watched = self.home + "/recording", self.home + "/watched"
+        programs = start(tool, "record", recording, port), start(tool, "watch", port, "--json", output=watched)
+
+        def holds(path, text):
+            if not os.path.exists(path):
+                return False
+            with open(path, "rb") as file:
+                return text in file.read()
+
+        wait_until("both to look", lambda: server.send(port, "menu.hide") or (
+            holds(recording, b"menu.hide") and holds(watched, b'"name":"menu.hide"')))
+        server.send(port, "menu.show")
+        wait_until("the panel", Window("Tessel start menu").is_open)
+        wait_until("the recording", lambda: holds(recording, b"menu.show") and holds(watched, b'"name":"menu.show"'))
+        for program in programs:
+            end(program)
+        server.send(port, "menu.hide")
+        wait_until("the panel to close", lambda: not Window("Tessel start menu").is_open())
+        subprocess.run([tool, "replay", recording, port, "--speed", "0"], check=True)
+        wait_until("the panel, opened by the recording", Window("Tessel start menu").is_open)
 
     def test_is_a_client_of_the_daemon(self):
         Program("tesselDaemon", "--no-agent", "--machine", "sample")

@@ -4,8 +4,8 @@
 #include "lib/ipc/KXIPCClient.h"
 #include "lib/ipc/KXIPCServer.h"
 #include "platform/linux/LinuxPorts.h"
+#include "platform/linux/OutgoingPacket.h"
 #include "platform/linux/PollMainLoop.h"
-#include "platform/linux/PortPacket.h"
 #include "platform/linux/ProcProcessTable.h"
 
 #include <algorithm>

@@ -4,7 +4,7 @@
 #include <cstddef>
 #include <mutex>
 #include <string>
-#include <unordered_map>
+#include <vector>
 
 namespace {
 constexpr int entriesPerWindow = 10;

@@ -4,6 +4,9 @@
 #include "platform/Clock.h"
 #include "platform/MessagePort.h"
 #include "platform/linux/Descriptor.h"
+#include "platform/linux/OutgoingPacket.h"
+#include "platform/linux/OutgoingQueue.h"
+#include "platform/linux/PortAnswer.h"
 #include "platform/linux/PortNames.h"
 #include "platform/linux/PortPacket.h"
 #include "platform/linux/PortTap.h"
@@ -30,10 +33,6 @@ namespace platform {
 
 namespace {
 
-// A queue holds so much; one message alone may be of any size.
-constexpr std::size_t maximalQueuedBytes = maximalPayload;
-constexpr std::size_t maximalQueuedMessages = 65536;
-constexpr std::size_t maximalQueuedDescriptors = 128;
 // The system bounds what is on its way by the size of packets, whatever is in memory behind them.
 constexpr std::size_t maximalOnTheWay = std::size_t{64} << 20;
 
@@ -60,7 +59,8 @@ Destination::Destination(const PortNames& names, const Clock& clock, PortTap& ta
     , m_clock(clock)
     , m_tap(tap)
     , m_delegate(delegate)
-    , m_name(std::move(name)) {}
+    , m_name(std::move(name))
+    , m_queue(tap.counters) {}
 
 bool Destination::connect() {
     const std::lock_guard lock(m_mutex);
@@ -73,7 +73,7 @@ SendStatus Destination::send(BytePieces pieces, bool synchronous, RemotePort::Ti
     auto packet = OutgoingPacket::make(pieces, synchronous, synchronous ? ++m_sequence : 0, m_inlineLimit);
     if (!packet) return SendStatus::transportError;
     std::unique_lock lock(m_mutex);
-    if (m_queue.empty()) {
+    if (m_queue.isEmpty()) {
         const OutgoingPacket* const one[] = {&*packet};
         const auto [sending, count, socket] = transmit(lock, one);
         if (!MustWait(sending)) {
@@ -83,7 +83,7 @@ SendStatus Destination::send(BytePieces pieces, bool synchronous, RemotePort::Ti
         }
     }
     giveUpOverdue();
-    if (!hasRoomFor(*packet)) {
+    if (!m_queue.hasRoomFor(*packet)) {
         noteDrop();
         return synchronous ? SendStatus::sendTimeout : SendStatus::success;
     }
@@ -93,7 +93,7 @@ SendStatus Destination::send(BytePieces pieces, bool synchronous, RemotePort::Ti
 
 void Destination::drain() {
     const std::lock_guard lock(m_mutex);
-    drainLocked();
+    if (m_socket && DrainAnswers(m_socket->get()) != Reading::nothing) endConnection();
 }
 
 bool Destination::takeEnd() {
@@ -103,7 +103,7 @@ bool Destination::takeEnd() {
 
 bool Destination::isIdle() const {
     const std::lock_guard lock(m_mutex);
-    return !m_socket && m_queue.empty() && !m_ended;
+    return !m_socket && m_queue.isEmpty() && !m_ended;
 }
 
 Destination::Socket Destination::socket() const {
@@ -114,14 +114,14 @@ Destination::Socket Destination::socket() const {
 std::optional<Destination::Pending> Destination::flush() {
     std::unique_lock lock(m_mutex);
     giveUpOverdue();
-    while (!m_queue.empty()) {
+    while (!m_queue.isEmpty()) {
         const auto [sending, count, socket] = transmitFirst(lock);
         for (std::size_t i = 0; i < count; ++i) {
-            m_queue.front()->takenBy = socket;
+            m_queue.first()->takenBy = socket;
             removeFirst();
         }
         if (MustWait(sending))
-            return Pending{sending == Sending::busy ? m_socket : nullptr, m_queue.front()->deadline};
+            return Pending{sending == Sending::busy ? m_socket : nullptr, m_queue.first()->deadline};
         if (sending == Sending::taken) continue;
         // Without a receiver the rest has nowhere to go either.
         const auto given = sending == Sending::hungUp ? m_queue.size() : 1;
@@ -165,11 +165,11 @@ Sending Destination::reopenConnection() {
 
 /// The one that is first in the queue, and those after it that can go along.
 Destination::Transmission Destination::transmitFirst(std::unique_lock<std::mutex>& lock) {
-    std::array<std::shared_ptr<Waiting>, OutgoingPacket::largestGroup> kept;
+    std::array<OutgoingQueue::Pointer, OutgoingPacket::largestGroup> kept;
     std::array<const OutgoingPacket*, OutgoingPacket::largestGroup> packets;
     std::size_t count = 0;
     for (; count < std::min(packets.size(), m_queue.size()); ++count) {
-        kept[count] = m_queue[count];
+        kept[count] = m_queue.at(count);
         packets[count] = &kept[count]->packet;
         if (packets[count]->hasDescriptor()) break;
     }
@@ -217,29 +217,13 @@ void Destination::endConnection() {
     m_delegate.didChangeConnection(m_name);
 }
 
-void Destination::drainLocked() {
-    std::uint64_t ignored = 0;
-    auto reading = Reading::packet;
-    while (m_socket && reading == Reading::packet)
-        reading = ReadAnswer(m_socket->get(), ignored);
-    if (reading == Reading::end || reading == Reading::bad) endConnection();
-}
-
-bool Destination::hasRoomFor(const OutgoingPacket& packet) const {
-    return m_queue.empty() ||
-           (m_queuedBytes + packet.size() <= maximalQueuedBytes && m_queue.size() < maximalQueuedMessages &&
-            (!packet.hasDescriptor() || m_queuedDescriptors < maximalQueuedDescriptors));
-}
-
-std::shared_ptr<Destination::Waiting> Destination::enqueue(OutgoingPacket packet, Clock::Instant deadline) {
-    packet.own();
-    countQueued(packet, true);
-    m_queue.push_back(std::make_shared<Waiting>(Waiting{std::move(packet), deadline}));
+OutgoingQueue::Pointer Destination::enqueue(OutgoingPacket packet, Clock::Instant deadline) {
+    auto waiting = m_queue.add(std::move(packet), deadline);
     if (!m_isFlushed) m_isFlushed = m_delegate.didQueue(shared_from_this());
-    return m_queue.back();
+    return waiting;
 }
 
-SendStatus Destination::awaitTurn(std::unique_lock<std::mutex>& lock, const std::shared_ptr<Waiting>& waiting,
+SendStatus Destination::awaitTurn(std::unique_lock<std::mutex>& lock, const OutgoingQueue::Pointer& waiting,
                                   RemotePort::Timeouts timeouts) {
     const auto isDone = [&] { return waiting->takenBy || waiting->fate; };
     m_changed.wait_for(lock, timeouts.send, isDone);
@@ -250,62 +234,35 @@ SendStatus Destination::awaitTurn(std::unique_lock<std::mutex>& lock, const std:
         lock.unlock();
         return awaitAnswer(socket, waiting->packet.sequence(), timeouts.receive);
     }
-    countQueued(waiting->packet, false);
-    m_queue.pop_back();
+    m_queue.removeLast();
     noteDrop();
     return SendStatus::sendTimeout;
 }
 
 SendStatus Destination::awaitAnswer(const Socket& socket, std::uint64_t sequence,
                                     std::chrono::milliseconds timeout) {
-    using std::chrono::steady_clock;
-    const auto deadline = steady_clock::now() + timeout;
-    for (auto left = timeout; left.count() > 0;
-         left = std::chrono::ceil<std::chrono::milliseconds>(deadline - steady_clock::now())) {
-        setPatience(socket, left);
-        std::uint64_t answered = 0;
-        const auto reading = AwaitAnswer(socket->get(), answered);
-        if (reading == Reading::packet && answered == sequence) return SendStatus::success;
-        // Another packet answers a message that was not waited for to its end.
-        if (reading == Reading::packet || reading == Reading::nothing) continue;
-        const std::lock_guard lock(m_mutex);
-        if (m_socket == socket) endConnection();
-        return SendStatus::becameInvalid;
-    }
-    return SendStatus::receiveTimeout;
-}
-
-void Destination::setPatience(const Socket& socket, std::chrono::milliseconds time) {
-    if (m_patience == time && m_patient.lock() == socket) return;
-    m_patience = time;
-    m_patient = socket;
-    SetPatience(socket->get(), time);
+    const auto reading = m_answers.await(socket, sequence, timeout);
+    if (reading == Reading::packet) return SendStatus::success;
+    if (reading == Reading::nothing) return SendStatus::receiveTimeout;
+    const std::lock_guard lock(m_mutex);
+    if (m_socket == socket) endConnection();
+    return SendStatus::becameInvalid;
 }
 
 void Destination::giveUpOverdue() {
-    while (!m_queue.empty() && m_transmitting == 0 && m_queue.front()->deadline <= m_clock.now())
+    while (!m_queue.isEmpty() && m_transmitting == 0 && m_queue.first()->deadline <= m_clock.now())
         giveUpFirst(SendStatus::sendTimeout);
 }
 
 void Destination::removeFirst() {
-    countQueued(m_queue.front()->packet, false);
-    m_queue.pop_front();
+    m_queue.removeFirst();
     m_changed.notify_all();
 }
 
 void Destination::giveUpFirst(SendStatus fate) {
-    m_queue.front()->fate = fate;
+    m_queue.first()->fate = fate;
     removeFirst();
     noteDrop();
-}
-
-void Destination::countQueued(const OutgoingPacket& packet, bool isAdded) {
-    // Counts are unsigned: minus one wraps to what adds up right.
-    const std::size_t sign = isAdded ? 1 : std::size_t{0} - 1;
-    m_queuedBytes += sign * packet.size();
-    m_queuedDescriptors += packet.hasDescriptor() ? sign : 0;
-    m_tap.counters.queued += sign;
-    m_tap.counters.queuedBytes += sign * packet.size();
 }
 
 /// Says it once for each connection.

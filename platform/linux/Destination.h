@@ -2,13 +2,15 @@
 
 #include "platform/Clock.h"
 #include "platform/MessagePort.h"
+#include "platform/linux/OutgoingPacket.h"
+#include "platform/linux/OutgoingQueue.h"
+#include "platform/linux/PortAnswer.h"
 #include "platform/linux/PortNames.h"
 #include "platform/linux/PortPacket.h"
 #include "platform/linux/PortTap.h"
 
 #include <atomic>
 #include <condition_variable>
-#include <deque>
 #include <mutex>
 
 namespace platform {
@@ -56,14 +58,6 @@ public:
     std::optional<Pending> flush();
 
 private:
-    struct Waiting {
-        OutgoingPacket packet;
-        Clock::Instant deadline;
-        Socket takenBy{};                 ///< once it is sent
-        std::optional<SendStatus> fate{}; ///< once it is given up
-    };
-    using Queue = std::deque<std::shared_ptr<Waiting>>;
-
     Sending openConnection();
     Sending reopenConnection();
     using Packets = std::span<const OutgoingPacket* const>;
@@ -76,15 +70,11 @@ private:
     Transmission transmitFirst(std::unique_lock<std::mutex>& lock);
     void endConnection();
     bool hasRoomOnTheWay(const OutgoingPacket& packet);
-    void drainLocked();
-    bool hasRoomFor(const OutgoingPacket& packet) const;
-    std::shared_ptr<Waiting> enqueue(OutgoingPacket packet, Clock::Instant deadline);
-    SendStatus awaitTurn(std::unique_lock<std::mutex>& lock, const std::shared_ptr<Waiting>& waiting,
+    OutgoingQueue::Pointer enqueue(OutgoingPacket packet, Clock::Instant deadline);
+    SendStatus awaitTurn(std::unique_lock<std::mutex>& lock, const OutgoingQueue::Pointer& waiting,
                          RemotePort::Timeouts timeouts);
     SendStatus awaitAnswer(const Socket& socket, std::uint64_t sequence, std::chrono::milliseconds timeout);
-    void setPatience(const Socket& socket, std::chrono::milliseconds time);
     void giveUpOverdue();
-    void countQueued(const OutgoingPacket& packet, bool isAdded);
     void removeFirst();
     void giveUpFirst(SendStatus fate);
     void noteDrop();
@@ -95,19 +85,15 @@ private:
     Delegate& m_delegate;
     const std::string m_name;
     std::uint64_t m_sequence = 0; ///< main thread
-    /// How long a socket waits for an answer, and which was told so. Main thread.
-    std::chrono::milliseconds m_patience{};
-    std::weak_ptr<const Descriptor> m_patient;
+    AnswerWait m_answers;         ///< main thread
     std::atomic<std::size_t> m_inlineLimit = maximalInlinePayload;
 
     mutable std::mutex m_mutex; ///< guards what follows; nothing that takes long is done with it
     std::condition_variable m_changed;
     Socket m_socket;
     std::size_t m_onTheWay = 0;     ///< bytes in memory that the receiver may not have taken yet
-    Queue m_queue;                  ///< while it is empty, the main thread sends; else the flusher
+    OutgoingQueue m_queue;          ///< while it is empty, the main thread sends; else the flusher
     std::size_t m_transmitting = 0; ///< so many of the first in the queue
-    std::size_t m_queuedBytes = 0;
-    std::size_t m_queuedDescriptors = 0;
     bool m_isFlushed = false;
     bool m_isBelieved = false; ///< `connect` has said that there is an owner
     bool m_ended = false;

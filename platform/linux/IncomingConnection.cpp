@@ -1,6 +1,7 @@
 #include "platform/linux/IncomingConnection.h"
 
 #include "platform/MessagePort.h"
+#include "platform/linux/PortAnswer.h"
 #include "platform/linux/PortPacket.h"
 
 #include <cstdint>

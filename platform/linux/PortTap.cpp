@@ -3,6 +3,7 @@
 #include "lib/plist/Binary.h"
 #include "lib/plist/Value.h"
 #include "platform/linux/IncomingConnection.h"
+#include "platform/linux/OutgoingPacket.h"
 #include "platform/linux/PortNames.h"
 #include "platform/linux/PortPacket.h"
 

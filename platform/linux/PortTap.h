@@ -1,5 +1,6 @@
 #pragma once
 
+#include "platform/linux/OutgoingPacket.h"
 #include "platform/linux/PortPacket.h"
 
 #include <atomic>

@@ -3,6 +3,7 @@
 #include "platform/MainLoop.h"
 #include "platform/PortWatch.h"
 #include "platform/linux/Descriptor.h"
+#include "platform/linux/OutgoingPacket.h"
 #include "platform/linux/PortPacket.h"
 
 #include <cstdint>

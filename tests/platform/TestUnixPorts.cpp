@@ -260,3 +260,25 @@ TEST_F(UnixPorts, takeNoConnectionOfAnotherUser) {
     EXPECT_TRUE(reading.get().empty());
     EXPECT_EQ(ScratchHome::logged(": another user's\n"), 1);
 }
+
+TEST_F(UnixPorts, takeSoManyConnectionsOfAProcessAndNoMore) {
+    Listener listener(loop, server, name);
+    std::vector<std::unique_ptr<RawPeer>> peers;
+    for (int i = 0; i < 16; ++i)
+        peers.push_back(std::make_unique<RawPeer>(directory, name));
+    for (int i = 0; i < 12; ++i)
+        EXPECT_TRUE(RawPeer(directory, name).isCutOff());
+    EXPECT_EQ(ScratchHome::logged(": too many\n"), 10) << "a minute";
+    for (const auto& peer : peers)
+        peer->send(GoodPackets().front());
+    ASSERT_TRUE(listener.waitFor(peers.size()));
+    listener.arrivals().clear();
+    peers.pop_back();
+    // Turned away as long as the port has not seen that end.
+    const auto hasCome = [&] { return !listener.arrivals().empty(); };
+    for (int tries = 0; tries < 1000 && !hasCome(); ++tries) {
+        RawPeer(directory, name).trySend(GoodPackets().front());
+        loop.runUntil(hasCome, 20ms);
+    }
+    EXPECT_TRUE(hasCome()) << "once one has gone";
+}

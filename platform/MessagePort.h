@@ -34,6 +34,7 @@ struct Arrival {
     SharedBytes bytes;
     PortPeer sender;
     std::unique_ptr<Receipt> receipt;
+    PeekBytes peek{}; ///< into `bytes`; none where they are at hand anyway
 };
 
 /// A port under our name. The name is taken from the moment it is made until `close`.

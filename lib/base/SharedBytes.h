@@ -2,6 +2,7 @@
 
 #include <cstddef>
 #include <cstring>
+#include <functional>
 #include <memory>
 #include <span>
 #include <utility>
@@ -42,3 +43,7 @@ private:
     std::span<const std::byte> m_bytes;
     std::shared_ptr<const void> m_owner;
 };
+
+/// Copies a few bytes of many out, where to touch them costs more: in memory that was mapped and not read
+/// yet. False when it failed, or the bytes end before.
+using PeekBytes = std::function<bool(std::size_t offset, std::span<std::byte> to)>;

@@ -90,7 +90,7 @@ private:
     void WorkerThreadOnMessageReceived(platform::Arrival& arrival, std::vector<Delivery>& group) {
         constexpr auto routine = "WorkerThreadOnMessageReceived";
         std::string error;
-        auto envelope = plist::Parse(arrival.bytes, error, limits);
+        auto envelope = plist::Parse(arrival.bytes, error, limits, arrival.peek);
         if (error.empty()) error = KXIPCEnvelopeError(envelope);
         if (error.empty() && KXIPCEnvelopeIsFrom(envelope, arrival.sender)) {
             group.push_back({std::move(envelope), std::move(arrival.receipt)});

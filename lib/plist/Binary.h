@@ -1,5 +1,6 @@
 #pragma once
 
+#include "lib/base/SharedBytes.h"
 #include "lib/plist/Value.h"
 
 #include <cstddef>
@@ -23,8 +24,10 @@ struct Limits {
     std::size_t xmlBytes = bytes;       ///< the same for XML, which takes ten times its size in memory
 };
 
-/// The value, or nil and why in `error`. Linear in the size of `bytes`; the result shares them.
-Value ParseBinary(const Data& bytes, std::string& error, const Limits& limits = {});
+/// The value, or nil and why in `error`. Linear in the size of `bytes`; the result shares them. With `peek`
+/// large data is left untouched.
+Value ParseBinary(const Data& bytes, std::string& error, const Limits& limits = {},
+                  const PeekBytes& peek = nullptr);
 
 /// A written property list: pieces to be sent one after the other. Larger data values are not copied: a piece
 /// points at them. `keepAlive` holds all that the pieces point at.
@@ -36,11 +39,12 @@ struct Encoded {
 };
 
 /// No pieces and why in `error` when the value cannot be written: a nil in it, or past the limits. Equal
-/// strings, numbers and data are written once, and so is an array or a dictionary that is shared. Invalid
-/// UTF-8 becomes U+FFFD.
+/// strings, numbers and data are written once, and so is an array or a dictionary that is shared. Large
+/// data comes last. Invalid UTF-8 becomes U+FFFD.
 Encoded WriteBinary(const Value& value, std::string& error, const Limits& limits = {});
 
 /// Any format this library reads, told by its first bytes.
-Value Parse(const Data& bytes, std::string& error, const Limits& limits = {});
+Value Parse(const Data& bytes, std::string& error, const Limits& limits = {},
+            const PeekBytes& peek = nullptr);
 
 } // namespace plist

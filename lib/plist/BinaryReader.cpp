@@ -1,3 +1,4 @@
+#include "lib/base/SharedBytes.h"
 #include "lib/plist/Binary.h"
 #include "lib/plist/Document.h"
 #include "lib/plist/Unicode.h"
@@ -18,11 +19,42 @@ namespace {
 
 constexpr std::string_view kMagic = "bplist00";
 
+/// Looks at the first bytes of objects. Who touches a page of a mapping gets those around it too, and has
+/// them to give back: the first look at each stretch is made by a call, and the last where large data stands.
+class Heads {
+public:
+    Heads(const Data& bytes, const PeekBytes& peek)
+        : m_bytes(bytes)
+        , m_peek(peek)
+        , m_touched(peek ? bytes.size() / kStretch + 1 : 0) {}
+
+    Header at(std::size_t offset) {
+        const std::byte* object = m_bytes.data() + offset;
+        if (!m_peek || m_touched[offset / kStretch]) return headerAt(object);
+        std::byte head[16];
+        if (m_peek(offset, head)) {
+            Header header = headerAt(head);
+            header.payload = object + (header.payload - head);
+            if (header.kind == Kind::data && header.count >= kStretch / 2) return header;
+        }
+        m_touched[offset / kStretch] = true;
+        return headerAt(object);
+    }
+
+private:
+    static constexpr std::size_t kStretch = std::size_t{64} << 10; ///< what Linux brings in around a page
+
+    const Data& m_bytes;
+    const PeekBytes& m_peek;
+    std::vector<bool> m_touched;
+};
+
 /// Walks everything that can be reached from the top object, each object once.
 class Validator {
 public:
-    Validator(const Document& document, const Limits& limits, std::string& error)
+    Validator(const Document& document, const Limits& limits, const PeekBytes& peek, std::string& error)
         : m_document(document)
+        , m_heads(document.bytes, peek)
         , m_objects(std::min<std::size_t>(limits.objects, UINT32_MAX / 2))
         , m_nesting(std::min(limits.nesting, kDeepestNesting))
         , m_error(error)
@@ -59,7 +91,7 @@ private:
         if (offset < Document::kPrologue || offset >= m_document.table)
             return fail("an object lies outside the file");
         const std::byte* file = m_document.bytes.data();
-        const Header header = headerAt(file + offset);
+        const Header header = m_heads.at(offset);
         if (header.count == Header::kMalformed) return fail("an object is malformed");
         const auto start = static_cast<std::size_t>(header.payload - file);
         const std::size_t unit = unitSize(header.kind);
@@ -138,6 +170,7 @@ private:
     }
 
     const Document& m_document;
+    Heads m_heads;
     const std::size_t m_objects;
     const unsigned m_nesting;
     std::string& m_error;
@@ -172,7 +205,7 @@ const char* readTrailer(Document& document, std::uint64_t& top, const Limits& li
 
 } // namespace
 
-Value ParseBinary(const Data& bytes, std::string& error, const Limits& limits) {
+Value ParseBinary(const Data& bytes, std::string& error, const Limits& limits, const PeekBytes& peek) {
     auto document = std::make_shared<Document>();
     document->bytes = bytes;
     std::uint64_t top = 0;
@@ -180,7 +213,7 @@ Value ParseBinary(const Data& bytes, std::string& error, const Limits& limits) {
         error = reason;
         return {};
     }
-    if (!Validator(*document, limits, error).run(top)) return {};
+    if (!Validator(*document, limits, peek, error).run(top)) return {};
     const std::byte* object = bytes.data() + document->offsetOf(top);
     return Access::make(document, object);
 }

@@ -26,6 +26,8 @@ using Index = Uniquer::Index;
 
 /// Data of this size or more is pointed at; below it, copying is cheaper than another piece.
 constexpr std::size_t kPieceSize = 512;
+/// Data of this size or more comes last, so that what has to be looked at to read the rest stands together.
+constexpr std::size_t kLargeSize = std::size_t{32} << 10;
 
 /// Leaves are written as they are met; containers follow them, since the size of a reference is known only
 /// then.
@@ -47,6 +49,8 @@ public:
         Index top = 0;
         if (!add(value, 0, top)) return {};
         writeContainers();
+        for (const Index place : m_large)
+            writePiece(m_places[place]);
         writeTable(top);
         if (m_out.size() <= m_byteLimit) return std::move(m_out).finish(value);
         m_error = "the property list is too large";
@@ -181,8 +185,7 @@ private:
     }
 
     Index addData(std::span<const std::byte> bytes) {
-        const Token head = Token().putHead(Kind::data, bytes.size());
-        return bytes.size() < kPieceSize ? addLeaf(head, bytes) : addPiece(head, bytes);
+        return bytes.size() < kPieceSize ? addLeaf(headOfData(bytes.size()), bytes) : addPiece(bytes);
     }
 
     /// Puts head and content, unless the like of them has been put before.
@@ -203,13 +206,13 @@ private:
     }
 
     /// The same for data that is pointed at.
-    Index addPiece(const Token& head, std::span<const std::byte> bytes) {
+    Index addPiece(std::span<const std::byte> bytes) {
         const auto [place, isNew] = placeOf(bytes.data(), bytes.size());
-        if (isNew) m_places[place].object = addContent(head, bytes, place);
+        if (isNew) m_places[place].object = addContent(bytes, place);
         return m_places[place].object;
     }
 
-    Index addContent(const Token& head, std::span<const std::byte> bytes, Index place) {
+    Index addContent(std::span<const std::byte> bytes, Index place) {
         // Bounded: to write data twice does no harm, to compare megabytes with everything does.
         constexpr unsigned kPatience = 4;
         const auto isSame = [&](Index known) {
@@ -218,10 +221,20 @@ private:
         };
         const Index known = m_contents.findOrAdd(sampledHashOf(bytes), place, kPatience, isSame);
         if (known != Uniquer::kNone) return m_places[known].object;
-        const Index index = newObject({m_out.size(), 0});
-        m_out.put(head.bytes());
-        m_out.putElsewhere(bytes);
-        return index;
+        m_places[place].object = newObject({});
+        if (bytes.size() < kLargeSize)
+            writePiece(m_places[place]);
+        else
+            m_large.push_back(place);
+        return m_places[place].object;
+    }
+
+    static Token headOfData(std::size_t size) { return Token().putHead(Kind::data, size); }
+
+    void writePiece(const Place& place) {
+        m_objects[place.object].offset = m_out.size();
+        m_out.put(headOfData(place.size).bytes());
+        m_out.putElsewhere({static_cast<const std::byte*>(place.start), place.size});
     }
 
     /// Where it is in `m_places`, and whether only now.
@@ -286,6 +299,7 @@ private:
     std::pmr::vector<Index> m_references{
         &m_memory}; ///< of all containers; of dictionaries the keys, then the values
     std::pmr::vector<Place> m_places{&m_memory};
+    std::pmr::vector<Index> m_large{&m_memory}; ///< places of data that comes last
     Uniquer m_leaves{m_memory};
     Uniquer m_knownPlaces{m_memory};
     Uniquer m_contents{m_memory};

@@ -99,6 +99,18 @@ const void* Access::identity(const Value& container) {
     return view ? view->object : nullptr;
 }
 
+void Access::fetchAhead(const Array& array, std::size_t index) {
+    constexpr std::size_t kFar = 4, kNear = 2;
+    if (array.size() - index > kFar) __builtin_prefetch(identity(array[index + kFar]));
+    if (array.size() - index <= kNear) return;
+    const auto* near = std::get_if<std::shared_ptr<const Dictionary>>(&array[index + kNear].m_content);
+    if (!near) return;
+    constexpr std::size_t kLine = 64, kEntries = 5 * kLine; // of four or five entries
+    const auto* entries = reinterpret_cast<const std::byte*>((*near)->entries().data());
+    for (std::size_t line = 0; line < kEntries; line += kLine)
+        __builtin_prefetch(entries + line);
+}
+
 std::span<const std::byte> Access::bytes(const Value& value) {
     if (const auto* data = std::get_if<Data>(&value.m_content)) return data->span();
     const auto* view = std::get_if<View>(&value.m_content);

@@ -101,6 +101,8 @@ struct Access {
     /// What data holds, empty for other types.
     static std::span<const std::byte> bytes(const Value& value);
     static bool isNegative(const Value& integer) { return std::get<Integer>(integer.m_content).negative; }
+    /// Asks for what `all` comes to soon: a menu's many small parts lie scattered in cold memory.
+    static void fetchAhead(const Array& array, std::size_t index);
     /// Whether `holds(element)` for all elements or entries' values, asked in order until it is false.
     template <class Predicate>
     static bool all(const Value& container, const Predicate& holds);
@@ -108,8 +110,13 @@ struct Access {
 
 template <class Predicate>
 bool Access::all(const Value& container, const Predicate& holds) {
-    if (const auto* array = std::get_if<std::shared_ptr<const Array>>(&container.m_content))
-        return std::ranges::all_of(**array, holds);
+    if (const auto* array = std::get_if<std::shared_ptr<const Array>>(&container.m_content)) {
+        for (std::size_t i = 0; i < (*array)->size(); ++i) {
+            fetchAhead(**array, i);
+            if (!holds((**array)[i])) return false;
+        }
+        return true;
+    }
     if (const auto* entries = std::get_if<std::shared_ptr<const Dictionary>>(&container.m_content))
         return std::ranges::all_of((*entries)->entries(), holds, &Dictionary::Entry::second);
     return std::ranges::all_of(container.begin(), container.end(), holds);

@@ -76,7 +76,7 @@ Reading PacketReader::read(int socket, IncomingPacket& packet) {
         return Uninterrupted([&] { return recvmsg(socket, &message, MSG_DONTWAIT | MSG_CMSG_CLOEXEC); });
     });
     if (received < 0) return errno == EAGAIN ? Reading::nothing : Reading::end;
-    const auto descriptors = TakeControl(message, packet.sender);
+    auto descriptors = TakeControl(message, packet.sender);
     // An empty packet reads like the end, but has a sender.
     if (received == 0 && packet.sender.pid == 0) return Reading::end;
 
@@ -93,11 +93,13 @@ Reading PacketReader::read(int socket, IncomingPacket& packet) {
         return Reading::packet;
     }
     auto mapped = MapSealedMemory(descriptors.front(), packet.header.payloadLength);
-    if (!mapped)
+    if (!mapped) {
         packet.fault = "memory that is not sealed or not of the announced size";
-    else
-        packet.payload = std::move(*mapped);
-    return packet.fault ? Reading::bad : Reading::packet;
+        return Reading::bad;
+    }
+    packet.payload = std::move(*mapped);
+    packet.peek = PeekIntoMemory(std::move(descriptors.front()));
+    return Reading::packet;
 }
 
 } // namespace platform

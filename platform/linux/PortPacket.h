@@ -59,6 +59,7 @@ enum class Reading {
 struct IncomingPacket {
     PacketHeader header;
     SharedBytes payload;
+    PeekBytes peek{}; ///< into a payload in memory
     ucred sender{};
     const char* fault = nullptr; ///< when bad
 };

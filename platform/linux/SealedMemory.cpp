@@ -13,7 +13,9 @@
 #include <span>
 #include <sys/mman.h>
 #include <sys/stat.h>
+#include <sys/types.h>
 #include <sys/uio.h>
+#include <unistd.h>
 #include <utility>
 #include <vector>
 
@@ -67,6 +69,14 @@ std::optional<SharedBytes> MapSealedMemory(const Descriptor& memory, std::size_t
     const std::shared_ptr<const void> owner(
         mapping, [size](const void* start) { munmap(const_cast<void*>(start), size); });
     return SharedBytes({static_cast<const std::byte*>(mapping), size}, owner);
+}
+
+PeekBytes PeekIntoMemory(Descriptor memory) {
+    return [memory = std::make_shared<const Descriptor>(std::move(memory))](std::size_t offset,
+                                                                            std::span<std::byte> to) {
+        return std::cmp_equal(pread(memory->get(), to.data(), to.size(), static_cast<off_t>(offset)),
+                              to.size());
+    };
 }
 
 } // namespace platform

@@ -18,4 +18,7 @@ Descriptor WriteSealedMemory(BytePieces pieces);
 /// change.
 std::optional<SharedBytes> MapSealedMemory(const Descriptor& memory, std::size_t size);
 
+/// Keeps the descriptor.
+PeekBytes PeekIntoMemory(Descriptor memory);
+
 } // namespace platform

@@ -182,7 +182,8 @@ std::optional<Arrival> UnixLocalPort::take(const std::shared_ptr<IncomingConnect
         return std::nullopt;
     }
     m_tap.didReceive(packet.header, packet.payload, connection->peer().processID);
-    return Arrival{std::move(packet.payload), connection->peer(), connection->receipt(packet.header)};
+    return Arrival{std::move(packet.payload), connection->peer(), connection->receipt(packet.header),
+                   std::move(packet.peek)};
 }
 
 void UnixLocalPort::pause(std::uint64_t tag) {

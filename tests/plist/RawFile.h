@@ -2,7 +2,9 @@
 
 #include "lib/plist/Binary.h"
 
+#include <algorithm>
 #include <gtest/gtest.h>
+#include <span>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -13,11 +15,20 @@ inline Data dataOf(std::string_view bytes) {
     return Data::copyOf(bytes.data(), bytes.size());
 }
 
-/// Why the bytes are refused; empty when they are not.
+inline PeekBytes peekInto(const Data& file) {
+    return [file](std::size_t offset, std::span<std::byte> to) {
+        std::ranges::copy(file.span().subspan(offset, to.size()), to.begin());
+        return true;
+    };
+}
+
+/// Why the bytes are refused, however they are looked at; empty when they are not.
 inline std::string errorOf(const Data& file, const Limits& limits = {}) {
-    std::string error;
+    std::string error, peeked;
     const Value value = Parse(file, error, limits);
     EXPECT_EQ(value.isNil(), !error.empty());
+    EXPECT_EQ(Parse(file, peeked, limits, peekInto(file)).isNil(), !error.empty());
+    EXPECT_EQ(peeked, error);
     return error;
 }
 inline std::string errorOf(std::string_view text, const Limits& limits = {}) {

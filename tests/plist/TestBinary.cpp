@@ -129,6 +129,22 @@ TEST(Binary, DataIsNeverCopied) {
     EXPECT_EQ(inside, icon); // the bytes live as long as what points into them
 }
 
+TEST(Binary, LargeDataComesLastAndIsReadWithoutBeingTouched) {
+    const std::vector<std::byte> one(100'000, std::byte{1}), two(100'000, std::byte{2});
+    const auto file = written(Array{Data(one, nullptr), Data(two, nullptr), "after"}).joined();
+    const auto last = static_cast<std::size_t>(std::ranges::search(file.span(), two).data() - file.data());
+    EXPECT_LT(file.size() - last - two.size(), 50U);
+
+    std::vector<std::byte> spoiled(file.span().begin(), file.span().end());
+    spoiled[last - 6] = {}; // where the data's head is
+    const Data untouched(spoiled, nullptr);
+    EXPECT_EQ(errorOf(untouched), "an object is malformed");
+    std::string error;
+    EXPECT_EQ(Parse(untouched, error, {}, peekInto(file)).size(), 3U) << error;
+    const auto failing = [](std::size_t, std::span<std::byte>) { return false; };
+    EXPECT_EQ(Parse(file, error, {}, failing).at(1).data(), Data(two, nullptr));
+}
+
 TEST(Binary, ParsedPartsAreWrittenAsPartsOfOthers) {
     const Value part = reread(Dictionary{{"é", Array{"é", dataOf(std::string(600, 'd')), Dictionary{}}}});
     const Value outer = Dictionary{{"inner", part["é"]}, {"again", part}};

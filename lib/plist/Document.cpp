@@ -3,6 +3,7 @@
 #include "lib/plist/Unicode.h"
 #include "lib/plist/Value.h"
 
+#include <algorithm>
 #include <bit>
 #include <cstddef>
 #include <cstdint>
@@ -105,10 +106,9 @@ void Access::fetchAhead(const Array& array, std::size_t index) {
     if (array.size() - index <= kNear) return;
     const auto* near = std::get_if<std::shared_ptr<const Dictionary>>(&array[index + kNear].m_content);
     if (!near) return;
-    constexpr std::size_t kLine = 64, kEntries = 5 * kLine; // of four or five entries
-    const auto* entries = reinterpret_cast<const std::byte*>((*near)->entries().data());
-    for (std::size_t line = 0; line < kEntries; line += kLine)
-        __builtin_prefetch(entries + line);
+    const std::span entries = (*near)->entries(); // of about a cache line each
+    for (const auto& entry : entries.first(std::min<std::size_t>(entries.size(), 5)))
+        __builtin_prefetch(&entry);
 }
 
 std::span<const std::byte> Access::bytes(const Value& value) {

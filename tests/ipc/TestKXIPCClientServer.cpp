@@ -122,7 +122,7 @@ TEST_F(KXIPCClientServerTest, NobodyIsAddedWithoutANameOrTakenAwayByAnother) {
         << "dead";
     EXPECT_EQ(clientsAfterAdd({{KX_IPC_PARAM_MSG_TABLE, table}, {KX_IPC_PARAM_PSN, clientPeer.number()}}),
               1U);
-    for (const std::size_t size : {9, 9, 20}) { // MiB; not more than 16 together
+    for (const unsigned size : {9U, 9U, 20U}) { // MiB; not more than 16 together
         const Value large = plist::Array{Dictionary{{"name", std::string(size << 20, 'x')}}};
         clientsAfterAdd({{KX_IPC_PARAM_MSG_TABLE, large}, {KX_IPC_PARAM_PSN, clientPeer.number()}});
     }

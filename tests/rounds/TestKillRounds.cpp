@@ -109,9 +109,8 @@ protected:
 
 TEST_F(KillRounds, ThePairWorksAgainByItselfAndHoldsNoMoreThanBefore) {
     auto bounds = holdings();
-    for (const std::size_t process : {0, 3}) {
-        ++bounds[process +
-                 1]; // the worker that sends what had to wait starts when it is needed first, and stays
+    for (const unsigned process : {0U, 3U}) {
+        ++bounds[process + 1];         // the worker that sends what had to wait starts when needed, and stays
         bounds[process + 2] = 700'000; // two messages
     }
     const auto isHeld = [&] { return std::ranges::equal(holdings(), bounds, std::less_equal<>()); };

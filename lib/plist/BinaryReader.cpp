@@ -35,7 +35,7 @@ public:
         if (m_peek(offset, head)) {
             Header header = headerAt(head);
             header.payload = object + (header.payload - head);
-            if (header.kind == Kind::data && header.count >= kStretch / 2) return header;
+            if (header.kind == Kind::data && header.count >= kLargeData) return header;
         }
         m_touched[offset / kStretch] = true;
         return headerAt(object);

@@ -26,8 +26,6 @@ using Index = Uniquer::Index;
 
 /// Data of this size or more is pointed at; below it, copying is cheaper than another piece.
 constexpr std::size_t kPieceSize = 512;
-/// Data of this size or more comes last, so that what has to be looked at to read the rest stands together.
-constexpr std::size_t kLargeSize = std::size_t{32} << 10;
 
 /// Leaves are written as they are met; containers follow them, since the size of a reference is known only
 /// then.
@@ -222,7 +220,7 @@ private:
         const Index known = m_contents.findOrAdd(sampledHashOf(bytes), place, kPatience, isSame);
         if (known != Uniquer::kNone) return m_places[known].object;
         m_places[place].object = newObject({});
-        if (bytes.size() < kLargeSize)
+        if (bytes.size() < kLargeData)
             writePiece(m_places[place]);
         else
             m_large.push_back(place);

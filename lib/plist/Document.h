@@ -27,6 +27,9 @@ enum class Kind : std::uint8_t {
     dictionary = 0xD,
 };
 
+/// Data of this size or more is written last, and not touched while a document is read.
+inline constexpr std::size_t kLargeData = std::size_t{32} << 10;
+
 /// Big-endian, of 1 to 8 bytes. Loads 8 whatever the size: wherever a number of a document stands, at least
 /// the trailer follows.
 inline std::uint64_t readNumber(const std::byte* bytes, std::size_t size) {

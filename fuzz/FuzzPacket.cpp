@@ -17,8 +17,8 @@
 // From packet to dispatch: a server on a real port, and a peer that sends it any packet with any descriptors.
 //
 // An input's first byte says how it is sent: its low half the descriptors, bit 4 that a header is put in
-// front of it, bit 5 that it is sent twice. "PSNPSNPS" stands for the process number that the sender truly
-// has.
+// front of it, bit 5 that it is sent twice, bits 6 and 7 how often that is in one packet. "PSNPSNPS" stands
+// for the process number that the sender truly has.
 
 namespace {
 
@@ -68,6 +68,10 @@ void deliver(Process& process, const std::string& name, unsigned how, const std:
         if ((how & 0xF) >= 4) header.flags = PacketHeader::inMemory;
         packet.bytes = RawHeader(header) + ((how & 0xF) >= 4 ? "" : input);
     }
+    constexpr std::size_t repeats[] = {1, 2, 16, 17};
+    const auto once = packet.bytes;
+    for (auto i = repeats[how >> 6 & 3U]; i > 1; --i)
+        packet.bytes += once;
     for (unsigned i = 0; i <= (how >> 5 & 1U); ++i)
         peer.trySend(packet);
     peer.trySend({.bytes = RawHeader({.flags = PacketHeader::wantsAnswer})});

@@ -4,7 +4,7 @@
 #include "lib/ipc/KXIPCClient.h"
 #include "lib/ipc/KXIPCServer.h"
 #include "platform/linux/LinuxPorts.h"
-#include "platform/linux/OutgoingPacket.h"
+#include "platform/linux/OutgoingMessage.h"
 #include "platform/linux/PollMainLoop.h"
 #include "platform/linux/ProcProcessTable.h"
 
@@ -69,9 +69,9 @@ double CostBetween(std::size_t size, bool inMemory) {
     Times times;
     for (int i = 0; i < 220; ++i) {
         const auto start = Board::now();
-        const auto packet = platform::OutgoingPacket::make(pieces, false, 0, inMemory ? 0 : SIZE_MAX);
+        const auto message = platform::OutgoingMessage::make(pieces, false, 0, inMemory ? 0 : SIZE_MAX);
         char answer;
-        if (packet->send(ends[0]) != platform::Sending::taken) break; // more than the system grants
+        if (message->send(ends[0]) != platform::Sending::taken) break; // more than the system grants
         recv(ends[0], &answer, 1, 0);
         times.push_back(Board::now() - start);
     }

@@ -23,9 +23,9 @@ public:
 /// the main thread. Main thread only; the delegate must outlive it.
 ///
 /// Of a sender 16 messages or 64 MiB wait here to be handled, of all together 4096 and 512 MiB, but for the
-/// last message of each sender, which may be of any size; what is more waits at the senders. What cannot be
-/// parsed, or names another sender, is dropped with a log entry: ten a minute and sender, with all
-/// else that is wrong with what it sends.
+/// rest of each sender's last packet, which may be a message of any size or 16 in 256 KiB; what is more waits
+/// at the senders. What cannot be parsed, or names another sender, is dropped with a log entry: ten a minute
+/// and sender, with all else that is wrong with what it sends.
 class KXIPCMessageReceiver {
 public:
     KXIPCMessageReceiver(KXIPCContext& context, KXIPCMessageReceiverDelegate& delegate);

@@ -15,8 +15,9 @@ public:
         std::size_t messages; ///< each keeps a mapping at most
         std::size_t bytes;
     };
-    /// The last message that is let in may be of any size, so a sender keeps that much more at most. The
-    /// small number of messages keeps the others' from waiting behind a flood.
+    /// The last packet that is let in may have a message of any size, or as many as go in one, so a sender
+    /// keeps that much more at most. The small number of messages keeps the others' from waiting behind a
+    /// flood.
     static constexpr Bounds ofSender{16, std::size_t{64} << 20};
     /// Beyond this, only who has nothing waiting is let in.
     static constexpr Bounds ofAll{4096, std::size_t{512} << 20};
@@ -25,7 +26,7 @@ public:
     explicit Backlog(std::function<void()> onRoom)
         : m_onRoom(std::move(onRoom)) {}
 
-    /// Whether one more message of that sender is let in.
+    /// Whether one more packet of that sender is let in.
     bool admits(int sender);
     void add(int sender, std::size_t bytes);
     void remove(int sender, std::size_t bytes);

@@ -4,7 +4,7 @@
 #include "platform/Clock.h"
 #include "platform/MessagePort.h"
 #include "platform/linux/Descriptor.h"
-#include "platform/linux/OutgoingPacket.h"
+#include "platform/linux/OutgoingMessage.h"
 #include "platform/linux/OutgoingQueue.h"
 #include "platform/linux/PortAnswer.h"
 #include "platform/linux/PortNames.h"
@@ -12,8 +12,6 @@
 #include "platform/linux/PortTap.h"
 #include "platform/linux/SealedMemory.h"
 
-#include <algorithm>
-#include <array>
 #include <chrono>
 #include <cstddef>
 #include <cstdint>
@@ -70,24 +68,24 @@ bool Destination::connect() {
 }
 
 SendStatus Destination::send(BytePieces pieces, bool synchronous, RemotePort::Timeouts timeouts) {
-    auto packet = OutgoingPacket::make(pieces, synchronous, synchronous ? ++m_sequence : 0, m_inlineLimit);
-    if (!packet) return SendStatus::transportError;
+    auto message = OutgoingMessage::make(pieces, synchronous, synchronous ? ++m_sequence : 0, m_inlineLimit);
+    if (!message) return SendStatus::transportError;
     std::unique_lock lock(m_mutex);
     if (m_queue.isEmpty()) {
-        const OutgoingPacket* const one[] = {&*packet};
-        const auto [sending, count, socket] = transmit(lock, one);
+        const OutgoingMessage* const one[] = {&*message};
+        const auto [sending, socket] = transmit(lock, one);
         if (!MustWait(sending)) {
             if (!synchronous || sending != Sending::taken) return StatusFrom(sending);
             lock.unlock();
-            return awaitAnswer(socket, packet->sequence(), timeouts.receive);
+            return awaitAnswer(socket, message->sequence(), timeouts.receive);
         }
     }
     giveUpOverdue();
-    if (!m_queue.hasRoomFor(*packet)) {
+    if (!m_queue.hasRoomFor(*message)) {
         noteDrop();
         return synchronous ? SendStatus::sendTimeout : SendStatus::success;
     }
-    const auto waiting = enqueue(std::move(*packet), m_clock.now() + timeouts.send);
+    const auto waiting = enqueue(std::move(*message), m_clock.now() + timeouts.send);
     return synchronous ? awaitTurn(lock, waiting, timeouts) : SendStatus::success;
 }
 
@@ -115,11 +113,7 @@ std::optional<Destination::Pending> Destination::flush() {
     std::unique_lock lock(m_mutex);
     giveUpOverdue();
     while (!m_queue.isEmpty()) {
-        const auto [sending, count, socket] = transmitFirst(lock);
-        for (std::size_t i = 0; i < count; ++i) {
-            m_queue.first()->takenBy = socket;
-            removeFirst();
-        }
+        const auto sending = transmitFirst(lock);
         if (MustWait(sending))
             return Pending{sending == Sending::busy ? m_socket : nullptr, m_queue.first()->deadline};
         if (sending == Sending::taken) continue;
@@ -164,46 +158,42 @@ Sending Destination::reopenConnection() {
 }
 
 /// The one that is first in the queue, and those after it that can go along.
-Destination::Transmission Destination::transmitFirst(std::unique_lock<std::mutex>& lock) {
-    std::array<OutgoingQueue::Pointer, OutgoingPacket::largestGroup> kept;
-    std::array<const OutgoingPacket*, OutgoingPacket::largestGroup> packets;
-    std::size_t count = 0;
-    for (; count < std::min(packets.size(), m_queue.size()); ++count) {
-        kept[count] = m_queue.at(count);
-        packets[count] = &kept[count]->packet;
-        if (packets[count]->hasDescriptor()) break;
-    }
-    m_transmitting = std::max<std::size_t>(count, 1);
-    const auto transmission = transmit(lock, std::span(packets).first(m_transmitting));
+Sending Destination::transmitFirst(std::unique_lock<std::mutex>& lock) {
+    const auto packet = m_queue.firstPacket(m_inlineLimit);
+    m_transmitting = packet.size();
+    const auto [sending, socket] = transmit(lock, packet);
     m_transmitting = 0;
+    for (std::size_t left = sending == Sending::taken ? packet.size() : 0; left > 0; --left) {
+        m_queue.first()->takenBy = socket;
+        m_queue.removeFirst();
+    }
     m_changed.notify_all();
-    return transmission;
+    return sending;
 }
 
-/// Several in memory never go together. Unlocks while the system copies the packets: an asynchronous sender
-/// must not wait for that.
-Destination::Transmission Destination::transmit(std::unique_lock<std::mutex>& lock, Packets packets) {
-    const auto& first = *packets.front();
+/// Unlocks while the system copies the packet: an asynchronous sender must not wait for that.
+Destination::Transmission Destination::transmit(std::unique_lock<std::mutex>& lock, Packet packet) {
+    const auto& first = *packet.front();
     for (int attempt = 0; attempt < 2; ++attempt) {
         const auto opening = reopenConnection();
         if (opening != Sending::taken) return {opening};
         if (first.hasDescriptor() && !hasRoomOnTheWay(first)) return {Sending::exhausted};
         const auto socket = m_socket;
         lock.unlock();
-        auto sending = Sending::taken;
-        const auto count = OutgoingPacket::sendAll(socket->get(), packets, sending);
-        for (const auto* packet : packets.first(count))
-            m_tap.didSend(*packet, socket->get());
+        const auto sending = OutgoingMessage::sendTogether(socket->get(), packet);
+        if (sending == Sending::taken)
+            for (const auto* message : packet)
+                m_tap.didSend(*message, socket->get());
         lock.lock();
-        if (count > 0 && first.hasDescriptor()) m_onTheWay += first.size();
-        if (sending != Sending::hungUp) return {sending, count, socket};
+        if (sending == Sending::taken && first.hasDescriptor()) m_onTheWay += first.size();
+        if (sending != Sending::hungUp) return {sending, socket};
         if (m_socket == socket) endConnection();
     }
     return {Sending::hungUp};
 }
 
-bool Destination::hasRoomOnTheWay(const OutgoingPacket& packet) {
-    if (m_onTheWay == 0 || m_onTheWay + packet.size() <= maximalOnTheWay) return true;
+bool Destination::hasRoomOnTheWay(const OutgoingMessage& message) {
+    if (m_onTheWay == 0 || m_onTheWay + message.size() <= maximalOnTheWay) return true;
     int unread = 0;
     if (ioctl(m_socket->get(), SIOCOUTQ, &unread) == 0 && unread == 0) m_onTheWay = 0;
     return m_onTheWay == 0;
@@ -217,8 +207,8 @@ void Destination::endConnection() {
     m_delegate.didChangeConnection(m_name);
 }
 
-OutgoingQueue::Pointer Destination::enqueue(OutgoingPacket packet, Clock::Instant deadline) {
-    auto waiting = m_queue.add(std::move(packet), deadline);
+OutgoingQueue::Pointer Destination::enqueue(OutgoingMessage message, Clock::Instant deadline) {
+    auto waiting = m_queue.add(std::move(message), deadline);
     if (!m_isFlushed) m_isFlushed = m_delegate.didQueue(shared_from_this());
     return waiting;
 }
@@ -232,7 +222,7 @@ SendStatus Destination::awaitTurn(std::unique_lock<std::mutex>& lock, const Outg
     if (waiting->fate) return *waiting->fate;
     if (const auto socket = waiting->takenBy) {
         lock.unlock();
-        return awaitAnswer(socket, waiting->packet.sequence(), timeouts.receive);
+        return awaitAnswer(socket, waiting->message.sequence(), timeouts.receive);
     }
     m_queue.removeLast();
     noteDrop();
@@ -254,14 +244,10 @@ void Destination::giveUpOverdue() {
         giveUpFirst(SendStatus::sendTimeout);
 }
 
-void Destination::removeFirst() {
-    m_queue.removeFirst();
-    m_changed.notify_all();
-}
-
 void Destination::giveUpFirst(SendStatus fate) {
     m_queue.first()->fate = fate;
-    removeFirst();
+    m_queue.removeFirst();
+    m_changed.notify_all();
     noteDrop();
 }
 

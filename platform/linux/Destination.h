@@ -2,7 +2,7 @@
 
 #include "platform/Clock.h"
 #include "platform/MessagePort.h"
-#include "platform/linux/OutgoingPacket.h"
+#include "platform/linux/OutgoingMessage.h"
 #include "platform/linux/OutgoingQueue.h"
 #include "platform/linux/PortAnswer.h"
 #include "platform/linux/PortNames.h"
@@ -60,22 +60,20 @@ public:
 private:
     Sending openConnection();
     Sending reopenConnection();
-    using Packets = std::span<const OutgoingPacket* const>;
     struct Transmission {
         Sending sending;
-        std::size_t count = 0; ///< of packets that were taken
-        Socket socket{};       ///< by which
+        Socket socket{}; ///< by which it was taken
     };
-    Transmission transmit(std::unique_lock<std::mutex>& lock, Packets packets);
-    Transmission transmitFirst(std::unique_lock<std::mutex>& lock);
+    using Packet = std::span<const OutgoingMessage* const>;
+    Transmission transmit(std::unique_lock<std::mutex>& lock, Packet packet);
+    Sending transmitFirst(std::unique_lock<std::mutex>& lock);
     void endConnection();
-    bool hasRoomOnTheWay(const OutgoingPacket& packet);
-    OutgoingQueue::Pointer enqueue(OutgoingPacket packet, Clock::Instant deadline);
+    bool hasRoomOnTheWay(const OutgoingMessage& message);
+    OutgoingQueue::Pointer enqueue(OutgoingMessage message, Clock::Instant deadline);
     SendStatus awaitTurn(std::unique_lock<std::mutex>& lock, const OutgoingQueue::Pointer& waiting,
                          RemotePort::Timeouts timeouts);
     SendStatus awaitAnswer(const Socket& socket, std::uint64_t sequence, std::chrono::milliseconds timeout);
     void giveUpOverdue();
-    void removeFirst();
     void giveUpFirst(SendStatus fate);
     void noteDrop();
 

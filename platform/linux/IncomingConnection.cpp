@@ -28,7 +28,7 @@ private:
 
 std::unique_ptr<Receipt> IncomingConnection::receipt(const PacketHeader& header) {
     m_backlog->add(m_peer.processID, header.payloadLength);
-    if ((header.flags & PacketHeader::wantsAnswer) != 0) {
+    if (header.wantsAnAnswer()) {
         const std::lock_guard lock(m_mutex);
         ++m_answersDue;
     }
@@ -42,7 +42,7 @@ void IncomingConnection::close() {
 }
 
 void IncomingConnection::letGo(const PacketHeader& header) {
-    if ((header.flags & PacketHeader::wantsAnswer) != 0) answer(header.sequence);
+    if (header.wantsAnAnswer()) answer(header.sequence);
     m_backlog->remove(m_peer.processID, header.payloadLength);
 }
 

@@ -2,13 +2,14 @@
 
 #include "platform/Clock.h"
 #include "platform/MessagePort.h"
-#include "platform/linux/OutgoingPacket.h"
+#include "platform/linux/OutgoingMessage.h"
 #include "platform/linux/PortTap.h"
 
 #include <cstddef>
 #include <deque>
 #include <memory>
 #include <optional>
+#include <vector>
 
 namespace platform {
 
@@ -17,7 +18,7 @@ namespace platform {
 class OutgoingQueue {
 public:
     struct Waiting {
-        OutgoingPacket packet;
+        OutgoingMessage message;
         Clock::Instant deadline;
         std::shared_ptr<const Descriptor> takenBy{}; ///< the socket, once it is sent
         std::optional<SendStatus> fate{};            ///< once it is given up
@@ -30,16 +31,18 @@ public:
 
     bool isEmpty() const { return m_messages.empty(); }
     std::size_t size() const { return m_messages.size(); }
-    const Pointer& at(std::size_t index) const { return m_messages[index]; }
     const Pointer& first() const { return m_messages.front(); }
-    bool hasRoomFor(const OutgoingPacket& packet) const;
+    /// The first, and those after it that go in one packet with it; they stay where they are while they are
+    /// queued.
+    std::vector<const OutgoingMessage*> firstPacket(std::size_t inlineLimit) const;
+    bool hasRoomFor(const OutgoingMessage& message) const;
 
-    Pointer add(OutgoingPacket packet, Clock::Instant deadline);
+    Pointer add(OutgoingMessage message, Clock::Instant deadline);
     void removeFirst();
     void removeLast();
 
 private:
-    void count(const OutgoingPacket& packet, bool isAdded);
+    void count(const OutgoingMessage& message, bool isAdded);
 
     PortTap::Counters& m_counters;
     std::deque<Pointer> m_messages;

@@ -9,6 +9,7 @@
 #include <cerrno>
 #include <cstddef>
 #include <cstring>
+#include <span>
 #include <sys/socket.h>
 #include <sys/uio.h>
 #include <utility>
@@ -41,65 +42,94 @@ std::vector<Descriptor> TakeControl(msghdr& message, ucred& sender) {
     return descriptors;
 }
 
-/// What is wrong with a packet; null when nothing is.
-const char* PacketFault(const PacketHeader& header, PacketReader::Expecting expected,
-                        std::size_t inlineLength, std::size_t descriptors) {
-    using Header = PacketHeader;
+using Header = PacketHeader;
+
+/// What is wrong with a header in a packet with so many descriptors; null when nothing is.
+const char* HeaderFault(const Header& header, bool isForListener, std::size_t descriptors) {
     constexpr auto ofMessages = Header::wantsAnswer | Header::inMemory | Header::tap;
     constexpr auto ofCopies = ofMessages | Header::isAnswer | Header::outgoing;
-    const bool isForListener = expected == PacketReader::Expecting::messages;
     if (header.magic != Header::expectedMagic) return "not a packet";
     if (header.version != Header::currentVersion) return "unknown version";
     if ((header.flags & ~(isForListener ? ofMessages : ofCopies)) != 0) return "unknown flags";
     if (header.payloadLength > maximalPayload) return "too large";
     if (isForListener && header.isTap() && (header.flags != Header::tap || header.payloadLength > 0))
         return "a request to watch with more in it";
-    const bool inMemory = (header.flags & Header::inMemory) != 0;
-    if (descriptors != (inMemory ? 1 : 0)) return "wrong number of descriptors";
-    if (inlineLength != (inMemory ? 0 : header.payloadLength)) return "wrong length";
+    if (descriptors != (header.isInMemory() ? 1 : 0)) return "wrong number of descriptors";
+    return nullptr;
+}
+
+/// Adds the messages, whose payloads are borrowed. What is wrong with any of them; null when nothing is.
+const char* Split(std::span<const std::byte> bytes, bool isForListener, std::size_t descriptors,
+                  std::vector<IncomingMessage>& messages) {
+    do {
+        Header header;
+        if (messages.size() == largestGroup) return "too many messages";
+        if (bytes.size() < sizeof header) return "too short";
+        std::memcpy(&header, bytes.data(), sizeof header);
+        if (const auto* fault = HeaderFault(header, isForListener, descriptors)) return fault;
+        bytes = bytes.subspan(sizeof header);
+        const std::size_t length = header.isInMemory() ? 0 : header.payloadLength;
+        const bool goesAlone = !isForListener || (header.flags & ~Header::wantsAnswer) != 0;
+        if (length > bytes.size() || (goesAlone && (length < bytes.size() || !messages.empty())))
+            return "wrong length";
+        messages.push_back({header, SharedBytes(bytes.first(length), nullptr)});
+        bytes = bytes.subspan(length);
+    } while (!bytes.empty());
     return nullptr;
 }
 
 } // namespace
 
-Reading PacketReader::read(int socket, IncomingPacket& packet) {
-    packet = {};
-    std::array<iovec, 2> vectors{
-        {{&packet.header, sizeof packet.header}, {m_buffer.get(), maximalInlinePayload}}};
+Reading PacketReader::read(int socket) {
+    m_packet.messages.clear();
+    m_packet.sender = {};
+    m_packet.fault = nullptr;
+    iovec vector{m_buffer.get(), maximalLength};
     Control control;
     msghdr message = {};
-    message.msg_iov = vectors.data();
-    message.msg_iovlen = vectors.size();
+    message.msg_iov = &vector;
+    message.msg_iovlen = 1;
     message.msg_control = &control;
     message.msg_controllen = sizeof control;
     const auto received = DespiteReset([&] {
         return Uninterrupted([&] { return recvmsg(socket, &message, MSG_DONTWAIT | MSG_CMSG_CLOEXEC); });
     });
     if (received < 0) return errno == EAGAIN ? Reading::nothing : Reading::end;
-    auto descriptors = TakeControl(message, packet.sender);
+    auto descriptors = TakeControl(message, m_packet.sender);
     // An empty packet reads like the end, but has a sender.
-    if (received == 0 && packet.sender.pid == 0) return Reading::end;
+    if (received == 0 && m_packet.sender.pid == 0) return Reading::end;
 
     const auto length = static_cast<std::size_t>(received);
-    if (length < sizeof packet.header || IsTruncated(message)) {
-        packet.fault = IsTruncated(message) ? "too much" : "too short";
-        return Reading::bad;
-    }
-    const auto inlineLength = length - sizeof packet.header;
-    packet.fault = PacketFault(packet.header, m_expected, inlineLength, descriptors.size());
-    if (packet.fault) return Reading::bad;
+    m_packet.fault = IsTruncated(message) ? "too much"
+                                          : Split({m_buffer.get(), length}, m_expected == Expecting::messages,
+                                                  descriptors.size(), m_packet.messages);
+    if (m_packet.fault) return Reading::bad;
     if (descriptors.empty()) {
-        packet.payload = SharedBytes::copyOf(m_buffer.get(), inlineLength);
+        own(length);
         return Reading::packet;
     }
-    auto mapped = MapSealedMemory(descriptors.front(), packet.header.payloadLength);
+    auto& inMemory = m_packet.messages.front();
+    auto mapped = MapSealedMemory(descriptors.front(), inMemory.header.payloadLength);
     if (!mapped) {
-        packet.fault = "memory that is not sealed or not of the announced size";
+        m_packet.fault = "memory that is not sealed or not of the announced size";
         return Reading::bad;
     }
-    packet.payload = std::move(*mapped);
-    packet.peek = PeekIntoMemory(std::move(descriptors.front()));
+    inMemory.payload = std::move(*mapped);
+    inMemory.peek = PeekIntoMemory(std::move(descriptors.front()));
     return Reading::packet;
+}
+
+/// Copies the payloads out of the buffer: those of a small packet by one copy that they share, so that
+/// whoever keeps one of them keeps little more.
+void PacketReader::own(std::size_t length) {
+    constexpr std::size_t mostToShare = 8192;
+    const bool isShared = length <= mostToShare;
+    const auto copy = isShared ? SharedBytes::copyOf(m_buffer.get(), length) : SharedBytes();
+    for (auto& [header, payload, peek] : m_packet.messages) {
+        const auto offset = static_cast<std::size_t>(payload.data() - m_buffer.get());
+        payload = isShared ? copy.slice(offset, payload.size())
+                           : SharedBytes::copyOf(payload.data(), payload.size());
+    }
 }
 
 } // namespace platform

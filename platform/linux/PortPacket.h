@@ -20,6 +20,8 @@ struct PacketHeader {
         outgoing = 1 << 4, ///< a copy of what was sent, not of what was got
     };
     bool isTap() const { return (flags & tap) != 0; }
+    bool isInMemory() const { return (flags & inMemory) != 0; }
+    bool wantsAnAnswer() const { return (flags & wantsAnswer) != 0; }
     static constexpr std::array<char, 4> expectedMagic{'K', 'X', 'P', 'C'};
     static constexpr std::uint16_t currentVersion = 1;
 
@@ -31,7 +33,9 @@ struct PacketHeader {
 };
 static_assert(sizeof(PacketHeader) == 24);
 
-/// More than this goes through memory.
+/// So many messages at most are in one packet.
+constexpr std::size_t largestGroup = 16;
+/// More than this goes through memory, and a packet of several messages has no more after its first header.
 constexpr std::size_t maximalInlinePayload = std::size_t{256} << 10;
 /// How much goes inline where the system grants no larger send buffer than this.
 constexpr std::size_t InlineLimit(int sendBuffer) {
@@ -56,25 +60,34 @@ enum class Reading {
     bad,
 };
 
-struct IncomingPacket {
+struct IncomingMessage {
     PacketHeader header;
     SharedBytes payload;
     PeekBytes peek{}; ///< into a payload in memory
+};
+
+struct IncomingPacket {
+    std::vector<IncomingMessage> messages; ///< one at least
     ucred sender{};
     const char* fault = nullptr; ///< when bad
 };
 
-/// Reads messages. Keeps the room for a packet, so one serves all connections of a thread.
+/// Reads packets. Keeps the room for one, so one serves all connections of a thread.
 class PacketReader {
 public:
     enum class Expecting { messages, copies };
     explicit PacketReader(Expecting expected = Expecting::messages)
         : m_expected(expected) {}
-    Reading read(int socket, IncomingPacket& packet); ///< never blocks
+    Reading read(int socket);                     ///< never blocks
+    IncomingPacket& packet() { return m_packet; } ///< that was read last
 
 private:
+    void own(std::size_t length);
+
+    static constexpr std::size_t maximalLength = sizeof(PacketHeader) + maximalInlinePayload;
     const Expecting m_expected;
-    std::unique_ptr<std::byte[]> m_buffer = std::make_unique_for_overwrite<std::byte[]>(maximalInlinePayload);
+    std::unique_ptr<std::byte[]> m_buffer = std::make_unique_for_overwrite<std::byte[]>(maximalLength);
+    IncomingPacket m_packet;
 };
 
 } // namespace platform

@@ -3,7 +3,7 @@
 #include "lib/plist/Binary.h"
 #include "lib/plist/Value.h"
 #include "platform/linux/IncomingConnection.h"
-#include "platform/linux/OutgoingPacket.h"
+#include "platform/linux/OutgoingMessage.h"
 #include "platform/linux/PortNames.h"
 #include "platform/linux/PortPacket.h"
 
@@ -31,8 +31,8 @@ void PortTap::add(const std::shared_ptr<IncomingConnection>& watcher, std::uint6
     m_isWatched = true;
     const auto told = statistics();
     const std::span<const std::byte> pieces[] = {told.span()};
-    const auto packet = OutgoingPacket::make(pieces, false, sequence);
-    if (packet) packet->sendCopy(watcher->socket(), PacketHeader::tap | PacketHeader::isAnswer, sequence);
+    const auto message = OutgoingMessage::make(pieces, false, sequence);
+    if (message) message->sendCopy(watcher->socket(), PacketHeader::tap | PacketHeader::isAnswer, sequence);
 }
 
 void PortTap::didReceive(const PacketHeader& header, const SharedBytes& payload, int sender) {
@@ -40,29 +40,29 @@ void PortTap::didReceive(const PacketHeader& header, const SharedBytes& payload,
     if (!m_isWatched) return;
     const std::span<const std::byte> pieces[] = {payload.span()};
     const auto flags = header.flags & PacketHeader::wantsAnswer;
-    if (const auto packet = OutgoingPacket::make(pieces, false, 0))
-        copy(*packet, static_cast<std::uint16_t>(flags), sender);
+    if (const auto message = OutgoingMessage::make(pieces, false, 0))
+        copy(*message, static_cast<std::uint16_t>(flags), sender);
 }
 
-void PortTap::didSend(const OutgoingPacket& packet, int socket) {
+void PortTap::didSend(const OutgoingMessage& message, int socket) {
     ++counters.sent;
     if (!m_isWatched) return;
     ucred receiver = {};
     socklen_t size = sizeof receiver;
     getsockopt(socket, SOL_SOCKET, SO_PEERCRED, &receiver, &size);
-    const auto flags = packet.wantsAnswer() ? PacketHeader::wantsAnswer : 0;
-    copy(packet, static_cast<std::uint16_t>(flags | PacketHeader::outgoing), receiver.pid);
+    const auto flags = message.wantsAnswer() ? PacketHeader::wantsAnswer : 0;
+    copy(message, static_cast<std::uint16_t>(flags | PacketHeader::outgoing), receiver.pid);
 }
 
 /// A watcher who does not keep up misses what there is no room for, and sees it by the count.
-void PortTap::copy(const OutgoingPacket& packet, std::uint16_t flags, int otherEnd) {
+void PortTap::copy(const OutgoingMessage& message, std::uint16_t flags, int otherEnd) {
     flags = static_cast<std::uint16_t>(flags | PacketHeader::tap);
     const std::lock_guard lock(m_mutex);
     std::erase_if(m_watchers, [&](Watcher& watcher) {
         const auto connection = watcher.connection.lock();
         if (!connection) return true;
         const auto sequence = std::uint64_t{watcher.count++} << 32 | static_cast<std::uint32_t>(otherEnd);
-        return packet.sendCopy(connection->socket(), flags, sequence) == Sending::hungUp;
+        return message.sendCopy(connection->socket(), flags, sequence) == Sending::hungUp;
     });
     m_isWatched = !m_watchers.empty();
 }

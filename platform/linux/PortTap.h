@@ -1,6 +1,6 @@
 #pragma once
 
-#include "platform/linux/OutgoingPacket.h"
+#include "platform/linux/OutgoingMessage.h"
 #include "platform/linux/PortPacket.h"
 
 #include <atomic>
@@ -32,7 +32,7 @@ public:
 
     void didReceive(const PacketHeader& header, const SharedBytes& payload, int sender);
     /// `socket` is the connection it was sent on.
-    void didSend(const OutgoingPacket& packet, int socket);
+    void didSend(const OutgoingMessage& message, int socket);
 
 private:
     struct Watcher {
@@ -40,7 +40,7 @@ private:
         std::uint32_t count = 0; ///< of what has passed since
     };
     SharedBytes statistics() const; ///< leaves those who watch out
-    void copy(const OutgoingPacket& packet, std::uint16_t flags, int otherEnd);
+    void copy(const OutgoingMessage& message, std::uint16_t flags, int otherEnd);
 
     std::atomic<bool> m_isWatched = false;
     std::mutex m_mutex; ///< guards what follows

@@ -19,7 +19,6 @@
 #include <fcntl.h>
 #include <memory>
 #include <mutex>
-#include <optional>
 #include <span>
 #include <string>
 #include <sys/epoll.h>
@@ -34,7 +33,6 @@ namespace platform {
 namespace {
 constexpr std::uint64_t wakeTag = 0;
 constexpr std::uint64_t listenerTag = 1;
-constexpr std::size_t largestGroup = 16;
 constexpr int connectionsOfSender = 16;       // the library keeps one, and opens another now and then to look
 constexpr std::size_t connectionsOfAll = 512; // half of the descriptors that a process usually may have
 constexpr int restMilliseconds = 100;
@@ -156,34 +154,32 @@ void UnixLocalPort::read(std::uint64_t tag, PacketReader& reader, std::vector<Ar
             pause(tag);
             break;
         }
-        IncomingPacket packet;
-        if (!readPacket(*connection, reader, packet, isOver)) break;
-        isWaitedFor = (packet.header.flags & PacketHeader::wantsAnswer) != 0;
-        if (auto arrival = take(connection, std::move(packet))) group.push_back(std::move(*arrival));
+        if (!readPacket(*connection, reader, isOver)) break;
+        for (auto& message : reader.packet().messages) {
+            isWaitedFor |= message.header.wantsAnAnswer();
+            take(connection, message, group);
+        }
     }
     if (isOver) remove(tag);
 }
 
-bool UnixLocalPort::readPacket(const IncomingConnection& connection, PacketReader& reader,
-                               IncomingPacket& packet, bool& isOver) {
-    const auto reading = reader.read(connection.socket(), packet);
+bool UnixLocalPort::readPacket(const IncomingConnection& connection, PacketReader& reader, bool& isOver) {
+    const auto reading = reader.read(connection.socket());
+    const auto& packet = reader.packet();
     const bool isOwn = packet.sender.uid == m_user && packet.sender.pid == connection.peer().processID;
     if (reading == Reading::packet && isOwn) return true;
     isOver = reading != Reading::nothing;
-    if (reading == Reading::packet) packet.fault = "sent by another process";
-    if (packet.fault) complain(connection.peer().processID, packet.fault);
+    const auto* const fault = reading == Reading::packet ? "sent by another process" : packet.fault;
+    if (fault) complain(connection.peer().processID, fault);
     return false;
 }
 
-std::optional<Arrival> UnixLocalPort::take(const std::shared_ptr<IncomingConnection>& connection,
-                                           IncomingPacket packet) {
-    if (packet.header.isTap()) {
-        m_tap.add(connection, packet.header.sequence);
-        return std::nullopt;
-    }
-    m_tap.didReceive(packet.header, packet.payload, connection->peer().processID);
-    return Arrival{std::move(packet.payload), connection->peer(), connection->receipt(packet.header),
-                   std::move(packet.peek)};
+void UnixLocalPort::take(const std::shared_ptr<IncomingConnection>& connection, IncomingMessage& message,
+                         std::vector<Arrival>& group) {
+    if (message.header.isTap()) return m_tap.add(connection, message.header.sequence);
+    m_tap.didReceive(message.header, message.payload, connection->peer().processID);
+    group.push_back({std::move(message.payload), connection->peer(), connection->receipt(message.header),
+                     std::move(message.peek)});
 }
 
 void UnixLocalPort::pause(std::uint64_t tag) {

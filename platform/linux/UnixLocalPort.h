@@ -38,9 +38,9 @@ private:
     void rest(int error);
     void listenAgain();
     void read(std::uint64_t tag, PacketReader& reader, std::vector<Arrival>& group);
-    bool readPacket(const IncomingConnection& connection, PacketReader& reader, IncomingPacket& packet,
-                    bool& isOver);
-    std::optional<Arrival> take(const std::shared_ptr<IncomingConnection>& connection, IncomingPacket packet);
+    bool readPacket(const IncomingConnection& connection, PacketReader& reader, bool& isOver);
+    void take(const std::shared_ptr<IncomingConnection>& connection, IncomingMessage& message,
+              std::vector<Arrival>& group);
     void pause(std::uint64_t tag);
     void resumePaused();
     void remove(std::uint64_t tag);

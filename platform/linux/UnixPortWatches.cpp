@@ -3,7 +3,7 @@
 #include "platform/MainLoop.h"
 #include "platform/PortWatch.h"
 #include "platform/linux/Descriptor.h"
-#include "platform/linux/OutgoingPacket.h"
+#include "platform/linux/OutgoingMessage.h"
 #include "platform/linux/PortPacket.h"
 
 #include <cstdint>
@@ -25,10 +25,9 @@ public:
 private:
     /// One packet a turn: the delegate may end this handle.
     void read() {
-        IncomingPacket packet;
-        switch (m_reader.read(m_socket.get(), packet)) {
+        switch (m_reader.read(m_socket.get())) {
         case Reading::packet:
-            return tell(packet);
+            return tell(m_reader.packet().messages.front());
         case Reading::nothing:
             return;
         default:
@@ -37,15 +36,15 @@ private:
         }
     }
 
-    void tell(const IncomingPacket& packet) {
-        const auto flags = packet.header.flags;
-        if ((flags & PacketHeader::isAnswer) != 0) return m_delegate.onStatistics(packet.payload);
-        const auto count = static_cast<std::uint32_t>(packet.header.sequence >> 32);
+    void tell(const IncomingMessage& copy) {
+        const auto flags = copy.header.flags;
+        if ((flags & PacketHeader::isAnswer) != 0) return m_delegate.onStatistics(copy.payload);
+        const auto count = static_cast<std::uint32_t>(copy.header.sequence >> 32);
         const std::uint32_t missed = count - m_next;
         m_next = count + 1;
         m_delegate.onMessage({(flags & PacketHeader::outgoing) != 0,
-                              static_cast<int>(packet.header.sequence & 0xFFFFFFFF),
-                              (flags & PacketHeader::wantsAnswer) != 0, missed, packet.payload});
+                              static_cast<int>(copy.header.sequence & 0xFFFFFFFF),
+                              copy.header.wantsAnAnswer(), missed, copy.payload});
     }
 
     PortWatchDelegate& m_delegate;
@@ -60,7 +59,7 @@ private:
 std::unique_ptr<Handle> UnixPortWatches::watch(const std::string& name, PortWatchDelegate& delegate) {
     Descriptor socket;
     if (m_names.connect(name, socket) != PortNames::Connecting::done) return nullptr;
-    const auto request = OutgoingPacket::make({}, false, 0);
+    const auto request = OutgoingMessage::make({}, false, 0);
     if (request->sendCopy(socket.get(), PacketHeader::tap, 0) != Sending::taken) return nullptr;
     return std::make_unique<Watch>(m_mainLoop, std::move(socket), delegate);
 }

@@ -56,17 +56,28 @@ class Peer:
         with open(fresh, "wb"):
             os.rename(fresh, self.path("notices/" + name))
 
-    def send(self, port, name, info=None, synchronous=False):
-        """Waits for the answer to a synchronous one, and says whether there was one."""
-        self.counter += 1
-        message = {"name": name} if info is None else {"name": name, "userInfo": info}
-        payload = plistlib.dumps({"message": message, "psnKey": self.number, "messageID": self.counter,
-                                  "synchronous": synchronous}, fmt=plistlib.FMT_BINARY)
+    def connection(self, port):
         if port not in self.connections:
             self.connections[port] = socket.socket(socket.AF_UNIX, socket.SOCK_SEQPACKET)
             self.connections[port].setsockopt(socket.SOL_SOCKET, socket.SO_SNDBUF, 2 * MOST_INLINE)
             self.connections[port].connect(self.path(port))
-        connection, flags = self.connections[port], WAITS if synchronous else 0
+        return self.connections[port]
+
+    def payload(self, name, info, synchronous=False):
+        self.counter += 1
+        message = {"name": name} if info is None else {"name": name, "userInfo": info}
+        return plistlib.dumps({"message": message, "psnKey": self.number, "messageID": self.counter,
+                               "synchronous": synchronous}, fmt=plistlib.FMT_BINARY)
+
+    def send_together(self, port, *messages):
+        """Names with their user information, in one packet."""
+        payloads = [self.payload(*message) for message in messages]
+        self.connection(port).send(b"".join(HEADER.pack(b"KXPC", 1, 0, len(each), 0) + each for each in payloads))
+
+    def send(self, port, name, info=None, synchronous=False):
+        """Waits for the answer to a synchronous one, and says whether there was one."""
+        payload = self.payload(name, info, synchronous)
+        connection, flags = self.connection(port), WAITS if synchronous else 0
         if len(payload) <= MOST_INLINE:
             connection.send(HEADER.pack(b"KXPC", 1, flags, len(payload), self.counter) + payload)
         else:
@@ -85,18 +96,19 @@ class Peer:
         packet, control, _, _ = sender.recvmsg(HEADER.size + MOST_INLINE, 256)
         if not packet:
             return False
-        magic, version, flags, length, sequence = HEADER.unpack_from(packet)
-        assert (magic, version) == (b"KXPC", 1)
-        payload = packet[HEADER.size:]
-        for level, kind, data in control:
-            if (level, kind) == (socket.SOL_SOCKET, socket.SCM_RIGHTS):
-                memory, = array.array("i", data)
-                payload = os.pread(memory, length, 0)
-                os.close(memory)
-        assert len(payload) == length
-        self.arrived.append(plistlib.loads(payload))
-        if flags & WAITS:
-            sender.send(HEADER.pack(b"KXPC", 1, ANSWER, 0, sequence))
+        memory = [os.fdopen(number, "rb") for level, kind, data in control
+                  if (level, kind) == (socket.SOL_SOCKET, socket.SCM_RIGHTS) for number in array.array("i", data)]
+        while packet:
+            magic, version, flags, length, sequence = HEADER.unpack_from(packet)
+            assert (magic, version) == (b"KXPC", 1)
+            end = HEADER.size + (0 if flags & IN_MEMORY else length)
+            payload, packet = packet[HEADER.size:end], packet[end:]
+            if flags & IN_MEMORY:
+                payload = os.pread(memory[0].fileno(), length, 0)
+            assert len(payload) == length
+            self.arrived.append(plistlib.loads(payload))
+            if flags & WAITS:
+                sender.send(HEADER.pack(b"KXPC", 1, ANSWER, 0, sequence))
         return True
 
     def turn(self):

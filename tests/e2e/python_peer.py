@@ -94,10 +94,11 @@ class PythonPeer(unittest.TestCase):
         wait_until("the daemon", lambda: os.path.exists(os.path.join(self.directory, SERVER)))
         client = Peer(self.directory)
         self.addCleanup(client.close)
-        client.send(SERVER, "KX_IPC_ADD_LISTENER_NOTIFICATION",
-                    {"KX_IPC_PARAM_MSG_TABLE": [{"name": "menu.update"}], "KX_IPC_PARAM_PSN": client.number})
+        table = {"KX_IPC_PARAM_MSG_TABLE": [{"name": "menu.update"}], "KX_IPC_PARAM_PSN": client.number}
+        client.send_together(SERVER, ("KX_IPC_ADD_LISTENER_NOTIFICATION", table), ("menu.refresh", None))
         info, sender = client.wait_for("KX_IPC_CONNECTED_TO_SERVER_NOTIFICATION")
         self.assertEqual(info["KX_IPC_PARAM_PSN"], sender)
+        client.wait_for("menu.update")
         self.assertTrue(client.send(SERVER, "menu.refresh", synchronous=True), "is answered once it is handled")
         icons = []
         while not icons:
@@ -117,6 +118,9 @@ class PythonPeer(unittest.TestCase):
             self.assertTrue(client.send(SERVER, "menu.refresh", synchronous=True))
         client.turn()
         self.assertEqual(client.arrived, [], "nothing comes once it has left")
+        client.send_together(client.name, ("one", None), ("two", None))
+        client.wait_for("one")
+        self.assertEqual([each["message"]["name"] for each in client.arrived], ["two"])
 
 
 if __name__ == "__main__":

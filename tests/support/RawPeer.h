@@ -40,6 +40,13 @@ inline std::shared_ptr<platform::Descriptor> Memory(const std::string& contents,
     return memory;
 }
 
+inline sockaddr_un RawAddress(const std::string& directory, const std::string& name) {
+    sockaddr_un address = {};
+    address.sun_family = AF_UNIX;
+    (directory + '/' + name).copy(address.sun_path, sizeof address.sun_path - 1);
+    return address;
+}
+
 /// A peer without the library.
 class RawPeer {
 public:
@@ -47,9 +54,7 @@ public:
         : m_socket(socket(AF_UNIX, SOCK_SEQPACKET | SOCK_CLOEXEC, 0)) {
         const int room = 2 * platform::maximalInlinePayload;
         setsockopt(m_socket.get(), SOL_SOCKET, SO_SNDBUF, &room, sizeof room);
-        sockaddr_un address = {};
-        address.sun_family = AF_UNIX;
-        (directory + '/' + name).copy(address.sun_path, sizeof address.sun_path - 1);
+        const auto address = RawAddress(directory, name);
         Require(connect(m_socket.get(), reinterpret_cast<const sockaddr*>(&address), sizeof address) == 0,
                 "connect");
     }
@@ -91,10 +96,19 @@ private:
     platform::Descriptor m_socket;
 };
 
+inline std::string SmallMessages(std::size_t count) {
+    std::string packet;
+    for (; count > 0; --count)
+        packet += RawHeader({.payloadLength = 7}) + "payload";
+    return packet;
+}
+
+/// With eighteen messages.
 inline std::vector<RawPacket> GoodPackets() {
     const auto header = RawHeader({.flags = platform::PacketHeader::inMemory, .payloadLength = 7});
-    return {{"inline", RawHeader({.payloadLength = 7}) + "payload"},
-            {"in memory", header, {Memory("payload", allSeals)}}};
+    return {{"inline", SmallMessages(1)},
+            {"in memory", header, {Memory("payload", allSeals)}},
+            {"as many as go together", SmallMessages(platform::largestGroup)}};
 }
 
 inline std::vector<RawPacket> BadPackets() {
@@ -138,5 +152,20 @@ inline std::vector<RawPacket> BadPackets() {
     };
     for (const int missing : {F_SEAL_SEAL, F_SEAL_SHRINK, F_SEAL_GROW, F_SEAL_WRITE})
         packets.push_back({"a seal missing", memoryHeader, {Memory("payload", allSeals & ~missing)}});
+    for (const auto& packet : std::vector(packets))
+        packets.push_back(
+            {packet.what + ", behind another", SmallMessages(1) + packet.bytes, packet.descriptors});
+    packets.push_back({"one too many", SmallMessages(platform::largestGroup + 1)});
+    packets.push_back({"a byte behind the last", SmallMessages(2) + 'x'});
+    packets.push_back({"the last cut short", SmallMessages(2).substr(0, 61)});
+    packets.push_back({"memory behind another", SmallMessages(1) + memoryHeader, {sealed}});
+    packets.push_back({"two of one memory", memoryHeader + memoryHeader, {sealed}});
+    packets.push_back(
+        {"a watcher behind another", SmallMessages(1) + RawHeader({.flags = PacketHeader::tap})});
+    packets.push_back({"more together than go inline", [&] {
+                           const std::string half(platform::maximalInlinePayload / 2, 'x');
+                           const auto message = RawHeader({.payloadLength = half.size()}) + half;
+                           return message + message;
+                       }()});
     return packets;
 }

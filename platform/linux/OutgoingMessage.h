@@ -9,24 +9,25 @@
 #include <memory>
 #include <optional>
 #include <span>
+#include <sys/uio.h>
 #include <vector>
 
 namespace platform {
 
 /// A message on its way out.
-class OutgoingPacket {
+class OutgoingMessage {
 public:
     /// Borrows what goes inline until `own`; what does not is written to memory here. Nothing, with a
     /// warning, when it is too large or there is no memory.
-    static std::optional<OutgoingPacket> make(BytePieces pieces, bool wantsAnswer, std::uint64_t sequence,
-                                              std::size_t inlineLimit = maximalInlinePayload);
+    static std::optional<OutgoingMessage> make(BytePieces pieces, bool wantsAnswer, std::uint64_t sequence,
+                                               std::size_t inlineLimit = maximalInlinePayload);
 
     void own();
     /// Never blocks.
     Sending send(int socket) const { return send(socket, m_header); }
-    /// Several that own what goes inline, by one call. How many were taken; none: why not in `sending`.
-    static std::size_t sendAll(int socket, std::span<const OutgoingPacket* const> packets, Sending& sending);
-    static constexpr std::size_t largestGroup = 16;
+    /// Several in one packet, all or none: at most `largestGroup`, inline, owned, and together no longer than
+    /// what goes inline of one.
+    static Sending sendTogether(int socket, std::span<const OutgoingMessage* const> messages);
     /// The same payload under other flags.
     Sending sendCopy(int socket, std::uint16_t flags, std::uint64_t sequence) const;
     bool wantsAnswer() const { return (m_header.flags & PacketHeader::wantsAnswer) != 0; }
@@ -35,8 +36,8 @@ public:
     std::uint64_t sequence() const { return m_header.sequence; }
 
 private:
-    class Envelope;
     Sending send(int socket, const PacketHeader& header) const;
+    iovec* describe(const PacketHeader& header, iovec* to) const;
 
     PacketHeader m_header;
     std::vector<std::span<const std::byte>> m_pieces;

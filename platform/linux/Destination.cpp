@@ -20,7 +20,6 @@
 #include <memory>
 #include <mutex>
 #include <optional>
-#include <span>
 #include <string>
 #include <sys/ioctl.h>
 #include <sys/socket.h>
@@ -68,25 +67,26 @@ bool Destination::connect() {
 }
 
 SendStatus Destination::send(BytePieces pieces, bool synchronous, RemotePort::Timeouts timeouts) {
-    auto message = OutgoingMessage::make(pieces, synchronous, synchronous ? ++m_sequence : 0, m_inlineLimit);
+    const auto sequence = synchronous ? ++m_sequence : 0;
+    const auto message = OutgoingMessage::make(pieces, synchronous, sequence, m_inlineLimit);
     if (!message) return SendStatus::transportError;
     std::unique_lock lock(m_mutex);
     if (m_queue.isEmpty()) {
-        const OutgoingMessage* const one[] = {&*message};
-        const auto [sending, socket] = transmit(lock, one);
+        const auto [sending, socket] = transmit(lock, *message);
         if (!MustWait(sending)) {
             if (!synchronous || sending != Sending::taken) return StatusFrom(sending);
             lock.unlock();
-            return awaitAnswer(socket, message->sequence(), timeouts.receive);
+            return awaitAnswer(socket, sequence, timeouts.receive);
         }
     }
-    giveUpOverdue();
+    const auto now = m_clock.now();
+    giveUpOverdue(now);
     if (!m_queue.hasRoomFor(*message)) {
         noteDrop();
         return synchronous ? SendStatus::sendTimeout : SendStatus::success;
     }
-    const auto waiting = enqueue(std::move(*message), m_clock.now() + timeouts.send);
-    return synchronous ? awaitTurn(lock, waiting, timeouts) : SendStatus::success;
+    const auto waiting = enqueue(*message, now + timeouts.send);
+    return synchronous ? awaitTurn(lock, waiting, sequence, timeouts) : SendStatus::success;
 }
 
 void Destination::drain() {
@@ -111,11 +111,11 @@ Destination::Socket Destination::socket() const {
 
 std::optional<Destination::Pending> Destination::flush() {
     std::unique_lock lock(m_mutex);
-    giveUpOverdue();
+    giveUpOverdue(m_clock.now());
     while (!m_queue.isEmpty()) {
         const auto sending = transmitFirst(lock);
         if (MustWait(sending))
-            return Pending{sending == Sending::busy ? m_socket : nullptr, m_queue.first()->deadline};
+            return Pending{sending == Sending::busy ? m_socket : nullptr, m_queue.first()->packet.deadline()};
         if (sending == Sending::taken) continue;
         // Without a receiver the rest has nowhere to go either.
         const auto given = sending == Sending::hungUp ? m_queue.size() : 1;
@@ -157,43 +157,42 @@ Sending Destination::reopenConnection() {
     return opening;
 }
 
-/// The one that is first in the queue, and those after it that can go along.
 Sending Destination::transmitFirst(std::unique_lock<std::mutex>& lock) {
-    const auto packet = m_queue.firstPacket(m_inlineLimit);
-    m_transmitting = packet.size();
-    const auto [sending, socket] = transmit(lock, packet);
-    m_transmitting = 0;
-    for (std::size_t left = sending == Sending::taken ? packet.size() : 0; left > 0; --left) {
-        m_queue.first()->takenBy = socket;
-        m_queue.removeFirst();
+    const auto waiting = m_queue.first();
+    waiting->packet.close();
+    m_isTransmitting = true;
+    const auto [sending, socket] = transmit(lock, waiting->packet);
+    m_isTransmitting = false;
+    if (sending == Sending::taken) {
+        waiting->takenBy = socket;
+        m_queue.removeFirstPacket();
     }
     m_changed.notify_all();
     return sending;
 }
 
 /// Unlocks while the system copies the packet: an asynchronous sender must not wait for that.
-Destination::Transmission Destination::transmit(std::unique_lock<std::mutex>& lock, Packet packet) {
-    const auto& first = *packet.front();
+template <class Packet>
+Destination::Transmission Destination::transmit(std::unique_lock<std::mutex>& lock, const Packet& packet) {
+    const auto sizeInMemory = packet.sizeInMemory();
     for (int attempt = 0; attempt < 2; ++attempt) {
         const auto opening = reopenConnection();
         if (opening != Sending::taken) return {opening};
-        if (first.hasDescriptor() && !hasRoomOnTheWay(first)) return {Sending::exhausted};
+        if (sizeInMemory > 0 && !hasRoomOnTheWay(sizeInMemory)) return {Sending::exhausted};
         const auto socket = m_socket;
         lock.unlock();
-        const auto sending = OutgoingMessage::sendTogether(socket->get(), packet);
-        if (sending == Sending::taken)
-            for (const auto* message : packet)
-                m_tap.didSend(*message, socket->get());
+        const auto sending = packet.send(socket->get());
+        if (sending == Sending::taken) m_tap.didSend(packet, socket->get());
         lock.lock();
-        if (sending == Sending::taken && first.hasDescriptor()) m_onTheWay += first.size();
+        if (sending == Sending::taken) m_onTheWay += sizeInMemory;
         if (sending != Sending::hungUp) return {sending, socket};
         if (m_socket == socket) endConnection();
     }
     return {Sending::hungUp};
 }
 
-bool Destination::hasRoomOnTheWay(const OutgoingMessage& message) {
-    if (m_onTheWay == 0 || m_onTheWay + message.size() <= maximalOnTheWay) return true;
+bool Destination::hasRoomOnTheWay(std::size_t size) {
+    if (m_onTheWay == 0 || m_onTheWay + size <= maximalOnTheWay) return true;
     int unread = 0;
     if (ioctl(m_socket->get(), SIOCOUTQ, &unread) == 0 && unread == 0) m_onTheWay = 0;
     return m_onTheWay == 0;
@@ -207,22 +206,22 @@ void Destination::endConnection() {
     m_delegate.didChangeConnection(m_name);
 }
 
-OutgoingQueue::Pointer Destination::enqueue(OutgoingMessage message, Clock::Instant deadline) {
-    auto waiting = m_queue.add(std::move(message), deadline);
+OutgoingQueue::Pointer Destination::enqueue(const OutgoingMessage& message, Clock::Instant deadline) {
+    auto waiting = m_queue.add(message, deadline, m_inlineLimit);
     if (!m_isFlushed) m_isFlushed = m_delegate.didQueue(shared_from_this());
     return waiting;
 }
 
 SendStatus Destination::awaitTurn(std::unique_lock<std::mutex>& lock, const OutgoingQueue::Pointer& waiting,
-                                  RemotePort::Timeouts timeouts) {
+                                  std::uint64_t sequence, RemotePort::Timeouts timeouts) {
     const auto isDone = [&] { return waiting->takenBy || waiting->fate; };
     m_changed.wait_for(lock, timeouts.send, isDone);
     // Only the main thread adds to the queue, and it was here: the message is the last.
-    m_changed.wait(lock, [&] { return isDone() || m_transmitting < m_queue.size(); });
+    m_changed.wait(lock, [&] { return isDone() || !m_isTransmitting || m_queue.first() != waiting; });
     if (waiting->fate) return *waiting->fate;
     if (const auto socket = waiting->takenBy) {
         lock.unlock();
-        return awaitAnswer(socket, waiting->message.sequence(), timeouts.receive);
+        return awaitAnswer(socket, sequence, timeouts.receive);
     }
     m_queue.removeLast();
     noteDrop();
@@ -239,14 +238,13 @@ SendStatus Destination::awaitAnswer(const Socket& socket, std::uint64_t sequence
     return SendStatus::becameInvalid;
 }
 
-void Destination::giveUpOverdue() {
-    while (!m_queue.isEmpty() && m_transmitting == 0 && m_queue.first()->deadline <= m_clock.now())
+void Destination::giveUpOverdue(Clock::Instant now) {
+    while (!m_queue.isEmpty() && !m_isTransmitting && m_queue.first()->packet.deadline() <= now)
         giveUpFirst(SendStatus::sendTimeout);
 }
 
 void Destination::giveUpFirst(SendStatus fate) {
-    m_queue.first()->fate = fate;
-    m_queue.removeFirst();
+    m_queue.giveUpFirst(fate);
     m_changed.notify_all();
     noteDrop();
 }

@@ -64,16 +64,16 @@ private:
         Sending sending;
         Socket socket{}; ///< by which it was taken
     };
-    using Packet = std::span<const OutgoingMessage* const>;
-    Transmission transmit(std::unique_lock<std::mutex>& lock, Packet packet);
+    template <class Packet>
+    Transmission transmit(std::unique_lock<std::mutex>& lock, const Packet& packet);
     Sending transmitFirst(std::unique_lock<std::mutex>& lock);
     void endConnection();
-    bool hasRoomOnTheWay(const OutgoingMessage& message);
-    OutgoingQueue::Pointer enqueue(OutgoingMessage message, Clock::Instant deadline);
+    bool hasRoomOnTheWay(std::size_t size);
+    OutgoingQueue::Pointer enqueue(const OutgoingMessage& message, Clock::Instant deadline);
     SendStatus awaitTurn(std::unique_lock<std::mutex>& lock, const OutgoingQueue::Pointer& waiting,
-                         RemotePort::Timeouts timeouts);
+                         std::uint64_t sequence, RemotePort::Timeouts timeouts);
     SendStatus awaitAnswer(const Socket& socket, std::uint64_t sequence, std::chrono::milliseconds timeout);
-    void giveUpOverdue();
+    void giveUpOverdue(Clock::Instant now);
     void giveUpFirst(SendStatus fate);
     void noteDrop();
 
@@ -89,9 +89,9 @@ private:
     mutable std::mutex m_mutex; ///< guards what follows; nothing that takes long is done with it
     std::condition_variable m_changed;
     Socket m_socket;
-    std::size_t m_onTheWay = 0;     ///< bytes in memory that the receiver may not have taken yet
-    OutgoingQueue m_queue;          ///< while it is empty, the main thread sends; else the flusher
-    std::size_t m_transmitting = 0; ///< so many of the first in the queue
+    std::size_t m_onTheWay = 0;    ///< bytes in memory that the receiver may not have taken yet
+    OutgoingQueue m_queue;         ///< while it is empty, the main thread sends; else the flusher
+    bool m_isTransmitting = false; ///< the first packet of the queue
     bool m_isFlushed = false;
     bool m_isBelieved = false; ///< `connect` has said that there is an owner
     bool m_ended = false;

@@ -14,35 +14,43 @@
 
 namespace platform {
 
-/// A message on its way out.
+/// What goes along with a packet in memory; null with one that is inline.
+using PacketMemory = std::shared_ptr<const Descriptor>;
+
+/// Sends a packet made of these parts. Never blocks.
+Sending SendPacket(int socket, std::span<iovec> parts, const PacketMemory& memory);
+
+/// A message on its way out. Borrows what goes inline.
 class OutgoingMessage {
 public:
-    /// Borrows what goes inline until `own`; what does not is written to memory here. Nothing, with a
-    /// warning, when it is too large or there is no memory.
+    /// What does not go inline is written to memory here. Nothing, with a warning, when it is too large or
+    /// there is no memory.
     static std::optional<OutgoingMessage> make(BytePieces pieces, bool wantsAnswer, std::uint64_t sequence,
                                                std::size_t inlineLimit = maximalInlinePayload);
+    OutgoingMessage(const PacketHeader& header, BytePieces pieces, PacketMemory memory)
+        : m_header(header)
+        , m_pieces(pieces)
+        , m_memory(std::move(memory)) {}
 
-    void own();
-    /// Never blocks.
+    /// By itself. Never blocks.
     Sending send(int socket) const { return send(socket, m_header); }
-    /// Several in one packet, all or none: at most `largestGroup`, inline, owned, and together no longer than
-    /// what goes inline of one.
-    static Sending sendTogether(int socket, std::span<const OutgoingMessage* const> messages);
     /// The same payload under other flags.
     Sending sendCopy(int socket, std::uint16_t flags, std::uint64_t sequence) const;
-    bool wantsAnswer() const { return (m_header.flags & PacketHeader::wantsAnswer) != 0; }
-    bool hasDescriptor() const { return static_cast<bool>(m_memory); }
+    /// Adds what goes inline, with the header.
+    void appendTo(std::vector<std::byte>& bytes) const { append(m_header, bytes); }
+
+    const PacketHeader& header() const { return m_header; }
+    const PacketMemory& memory() const { return m_memory; }
     std::size_t size() const { return m_header.payloadLength; }
-    std::uint64_t sequence() const { return m_header.sequence; }
+    std::size_t sizeInMemory() const { return m_memory ? size() : 0; }
 
 private:
     Sending send(int socket, const PacketHeader& header) const;
-    iovec* describe(const PacketHeader& header, iovec* to) const;
+    void append(const PacketHeader& header, std::vector<std::byte>& bytes) const;
 
     PacketHeader m_header;
-    std::vector<std::span<const std::byte>> m_pieces;
-    std::shared_ptr<std::vector<std::byte>> m_copy;
-    Descriptor m_memory;
+    BytePieces m_pieces;
+    PacketMemory m_memory;
 };
 
 } // namespace platform

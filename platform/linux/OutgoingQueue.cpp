@@ -1,13 +1,13 @@
 #include "platform/linux/OutgoingQueue.h"
 
 #include "platform/Clock.h"
+#include "platform/MessagePort.h"
 #include "platform/linux/OutgoingMessage.h"
+#include "platform/linux/OutgoingPacket.h"
 #include "platform/linux/PortPacket.h"
 
 #include <cstddef>
 #include <memory>
-#include <utility>
-#include <vector>
 
 namespace platform {
 
@@ -16,51 +16,52 @@ namespace {
 constexpr std::size_t maximalBytes = maximalPayload;
 constexpr std::size_t maximalMessages = 65536;
 constexpr std::size_t maximalDescriptors = 128;
+
+// Counts are unsigned: minus one wraps to what adds up right.
+constexpr std::size_t added = 1, removed = std::size_t{0} - 1;
 } // namespace
 
 bool OutgoingQueue::hasRoomFor(const OutgoingMessage& message) const {
     return isEmpty() || (m_bytes + message.size() <= maximalBytes && size() < maximalMessages &&
-                         (!message.hasDescriptor() || m_descriptors < maximalDescriptors));
+                         (!message.memory() || m_descriptors < maximalDescriptors));
 }
 
-std::vector<const OutgoingMessage*> OutgoingQueue::firstPacket(std::size_t inlineLimit) const {
-    std::vector<const OutgoingMessage*> packet;
-    std::size_t length = 0;
-    for (const auto& waiting : m_messages) {
-        const auto& message = waiting->message;
-        length += message.size() + (packet.empty() ? 0 : sizeof(PacketHeader));
-        const bool fits = !message.hasDescriptor() && length <= inlineLimit && packet.size() < largestGroup;
-        if (!fits && !packet.empty()) break;
-        packet.push_back(&message);
-        if (!fits) break;
-    }
-    return packet;
+OutgoingQueue::Pointer OutgoingQueue::add(const OutgoingMessage& message, Clock::Instant deadline,
+                                          std::size_t inlineLimit) {
+    count(added, 1, message.size(), message.header().isInMemory());
+    if (isEmpty() || !m_packets.back()->packet.add(message, deadline, inlineLimit))
+        m_packets.push_back(std::make_shared<Waiting>(Waiting{OutgoingPacket(message, deadline)}));
+    return m_packets.back();
 }
 
-OutgoingQueue::Pointer OutgoingQueue::add(OutgoingMessage message, Clock::Instant deadline) {
-    message.own();
-    count(message, true);
-    m_messages.push_back(std::make_shared<Waiting>(Waiting{std::move(message), deadline}));
-    return m_messages.back();
+void OutgoingQueue::removeFirstPacket() {
+    const auto& packet = first()->packet;
+    count(removed, packet.count(), packet.size(), packet.first().isInMemory());
+    m_packets.pop_front();
 }
 
-void OutgoingQueue::removeFirst() {
-    count(first()->message, false);
-    m_messages.pop_front();
+void OutgoingQueue::giveUpFirst(SendStatus fate) {
+    auto& packet = first()->packet;
+    count(removed, 1, packet.first().payloadLength, packet.first().isInMemory());
+    packet.removeFirst();
+    if (packet.count() > 0) return;
+    first()->fate = fate;
+    m_packets.pop_front();
 }
 
 void OutgoingQueue::removeLast() {
-    count(m_messages.back()->message, false);
-    m_messages.pop_back();
+    auto& packet = m_packets.back()->packet;
+    count(removed, 1, packet.last().payloadLength, packet.last().isInMemory());
+    packet.removeLast();
+    if (packet.count() == 0) m_packets.pop_back();
 }
 
-void OutgoingQueue::count(const OutgoingMessage& message, bool isAdded) {
-    // Counts are unsigned: minus one wraps to what adds up right.
-    const std::size_t sign = isAdded ? 1 : std::size_t{0} - 1;
-    m_bytes += sign * message.size();
-    m_descriptors += message.hasDescriptor() ? sign : 0;
-    m_counters.queued += sign;
-    m_counters.queuedBytes += sign * message.size();
+void OutgoingQueue::count(std::size_t sign, std::size_t messages, std::size_t bytes, bool isInMemory) {
+    m_size += sign * messages;
+    m_bytes += sign * bytes;
+    m_descriptors += isInMemory ? sign : 0;
+    m_counters.queued += sign * messages;
+    m_counters.queuedBytes += sign * bytes;
 }
 
 } // namespace platform

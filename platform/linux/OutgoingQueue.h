@@ -3,13 +3,13 @@
 #include "platform/Clock.h"
 #include "platform/MessagePort.h"
 #include "platform/linux/OutgoingMessage.h"
+#include "platform/linux/OutgoingPacket.h"
 #include "platform/linux/PortTap.h"
 
 #include <cstddef>
 #include <deque>
 #include <memory>
 #include <optional>
-#include <vector>
 
 namespace platform {
 
@@ -18,10 +18,9 @@ namespace platform {
 class OutgoingQueue {
 public:
     struct Waiting {
-        OutgoingMessage message;
-        Clock::Instant deadline;
+        OutgoingPacket packet;
         std::shared_ptr<const Descriptor> takenBy{}; ///< the socket, once it is sent
-        std::optional<SendStatus> fate{};            ///< once it is given up
+        std::optional<SendStatus> fate{};            ///< once its last message is given up
     };
     using Pointer = std::shared_ptr<Waiting>;
 
@@ -29,23 +28,23 @@ public:
     explicit OutgoingQueue(PortTap::Counters& counters)
         : m_counters(counters) {}
 
-    bool isEmpty() const { return m_messages.empty(); }
-    std::size_t size() const { return m_messages.size(); }
-    const Pointer& first() const { return m_messages.front(); }
-    /// The first, and those after it that go in one packet with it; they stay where they are while they are
-    /// queued.
-    std::vector<const OutgoingMessage*> firstPacket(std::size_t inlineLimit) const;
+    bool isEmpty() const { return m_packets.empty(); }
+    std::size_t size() const { return m_size; } ///< messages
+    const Pointer& first() const { return m_packets.front(); }
     bool hasRoomFor(const OutgoingMessage& message) const;
 
-    Pointer add(OutgoingMessage message, Clock::Instant deadline);
-    void removeFirst();
+    /// What it was put into, last of all.
+    Pointer add(const OutgoingMessage& message, Clock::Instant deadline, std::size_t inlineLimit);
+    void removeFirstPacket();
+    void giveUpFirst(SendStatus fate);
     void removeLast();
 
 private:
-    void count(const OutgoingMessage& message, bool isAdded);
+    void count(std::size_t sign, std::size_t messages, std::size_t bytes, bool isInMemory);
 
     PortTap::Counters& m_counters;
-    std::deque<Pointer> m_messages;
+    std::deque<Pointer> m_packets;
+    std::size_t m_size = 0;
     std::size_t m_bytes = 0;
     std::size_t m_descriptors = 0;
 };

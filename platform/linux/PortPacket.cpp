@@ -122,8 +122,7 @@ Reading PacketReader::read(int socket) {
 /// Copies the payloads out of the buffer: those of a small packet by one copy that they share, so that
 /// whoever keeps one of them keeps little more.
 void PacketReader::own(std::size_t length) {
-    constexpr std::size_t mostToShare = 8192;
-    const bool isShared = length <= mostToShare;
+    const bool isShared = length <= smallPacket;
     const auto copy = isShared ? SharedBytes::copyOf(m_buffer.get(), length) : SharedBytes();
     for (auto& [header, payload, peek] : m_packet.messages) {
         const auto offset = static_cast<std::size_t>(payload.data() - m_buffer.get());

@@ -35,6 +35,8 @@ static_assert(sizeof(PacketHeader) == 24);
 
 /// So many messages at most are in one packet.
 constexpr std::size_t largestGroup = 16;
+/// Messages go together up to this length of a packet; in longer ones they would save nothing.
+constexpr std::size_t smallPacket = 8192;
 /// More than this goes through memory, and a packet of several messages has no more after its first header.
 constexpr std::size_t maximalInlinePayload = std::size_t{256} << 10;
 /// How much goes inline where the system grants no larger send buffer than this.

@@ -4,6 +4,7 @@
 #include "lib/plist/Value.h"
 #include "platform/linux/IncomingConnection.h"
 #include "platform/linux/OutgoingMessage.h"
+#include "platform/linux/OutgoingPacket.h"
 #include "platform/linux/PortNames.h"
 #include "platform/linux/PortPacket.h"
 
@@ -46,11 +47,19 @@ void PortTap::didReceive(const PacketHeader& header, const SharedBytes& payload,
 
 void PortTap::didSend(const OutgoingMessage& message, int socket) {
     ++counters.sent;
-    if (!m_isWatched) return;
+    if (m_isWatched) copySent(message, socket);
+}
+
+void PortTap::didSend(const OutgoingPacket& packet, int socket) {
+    counters.sent += packet.count();
+    if (m_isWatched) packet.forEach([&](const OutgoingMessage& message) { copySent(message, socket); });
+}
+
+void PortTap::copySent(const OutgoingMessage& message, int socket) {
     ucred receiver = {};
     socklen_t size = sizeof receiver;
     getsockopt(socket, SOL_SOCKET, SO_PEERCRED, &receiver, &size);
-    const auto flags = message.wantsAnswer() ? PacketHeader::wantsAnswer : 0;
+    const auto flags = message.header().flags & PacketHeader::wantsAnswer;
     copy(message, static_cast<std::uint16_t>(flags | PacketHeader::outgoing), receiver.pid);
 }
 

@@ -1,6 +1,7 @@
 #pragma once
 
 #include "platform/linux/OutgoingMessage.h"
+#include "platform/linux/OutgoingPacket.h"
 #include "platform/linux/PortPacket.h"
 
 #include <atomic>
@@ -33,6 +34,7 @@ public:
     void didReceive(const PacketHeader& header, const SharedBytes& payload, int sender);
     /// `socket` is the connection it was sent on.
     void didSend(const OutgoingMessage& message, int socket);
+    void didSend(const OutgoingPacket& packet, int socket);
 
 private:
     struct Watcher {
@@ -40,6 +42,7 @@ private:
         std::uint32_t count = 0; ///< of what has passed since
     };
     SharedBytes statistics() const; ///< leaves those who watch out
+    void copySent(const OutgoingMessage& message, int socket);
     void copy(const OutgoingMessage& message, std::uint16_t flags, int otherEnd);
 
     std::atomic<bool> m_isWatched = false;

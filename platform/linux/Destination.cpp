@@ -44,6 +44,13 @@ SendStatus StatusFrom(Sending sending) {
     }
 }
 
+/// Bytes of packets that are on their way, with what the system needs to keep them.
+int Unread(const Descriptor& socket) {
+    int bytes = 0;
+    ioctl(socket.get(), SIOCOUTQ, &bytes);
+    return bytes;
+}
+
 bool MustWait(Sending sending) {
     return sending == Sending::busy || sending == Sending::exhausted;
 }
@@ -71,7 +78,7 @@ SendStatus Destination::send(BytePieces pieces, bool synchronous, RemotePort::Ti
     const auto message = OutgoingMessage::make(pieces, synchronous, sequence, m_inlineLimit);
     if (!message) return SendStatus::transportError;
     std::unique_lock lock(m_mutex);
-    if (m_queue.isEmpty()) {
+    if (m_queue.isEmpty() && (synchronous || !isReceiverBehind(*message))) {
         const auto [sending, socket] = transmit(lock, *message);
         if (!MustWait(sending)) {
             if (!synchronous || sending != Sending::taken) return StatusFrom(sending);
@@ -193,9 +200,17 @@ Destination::Transmission Destination::transmit(std::unique_lock<std::mutex>& lo
 
 bool Destination::hasRoomOnTheWay(std::size_t size) {
     if (m_onTheWay == 0 || m_onTheWay + size <= maximalOnTheWay) return true;
-    int unread = 0;
-    if (ioctl(m_socket->get(), SIOCOUTQ, &unread) == 0 && unread == 0) m_onTheWay = 0;
+    if (Unread(*m_socket) == 0) m_onTheWay = 0;
     return m_onTheWay == 0;
+}
+
+/// Then a small message would wait for it anyway, and goes to the flusher, which sends it at once with those
+/// that come meanwhile: in packets of their own they cost both ends twice as much. Asked for one message in
+/// many, as asking costs a call.
+bool Destination::isReceiverBehind(const OutgoingMessage& message) {
+    constexpr int manyPackets = 16'384;
+    if (message.size() > smallPacket || ++m_asked % 32 != 0 || !m_socket) return false;
+    return Unread(*m_socket) > manyPackets;
 }
 
 void Destination::endConnection() {

@@ -69,6 +69,7 @@ private:
     Sending transmitFirst(std::unique_lock<std::mutex>& lock);
     void endConnection();
     bool hasRoomOnTheWay(std::size_t size);
+    bool isReceiverBehind(const OutgoingMessage& message);
     OutgoingQueue::Pointer enqueue(const OutgoingMessage& message, Clock::Instant deadline);
     SendStatus awaitTurn(std::unique_lock<std::mutex>& lock, const OutgoingQueue::Pointer& waiting,
                          std::uint64_t sequence, RemotePort::Timeouts timeouts);
@@ -84,13 +85,14 @@ private:
     const std::string m_name;
     std::uint64_t m_sequence = 0; ///< main thread
     AnswerWait m_answers;         ///< main thread
+    std::size_t m_asked = 0;      ///< main thread; whether the receiver is behind
     std::atomic<std::size_t> m_inlineLimit = maximalInlinePayload;
 
     mutable std::mutex m_mutex; ///< guards what follows; nothing that takes long is done with it
     std::condition_variable m_changed;
     Socket m_socket;
     std::size_t m_onTheWay = 0;    ///< bytes in memory that the receiver may not have taken yet
-    OutgoingQueue m_queue;         ///< while it is empty, the main thread sends; else the flusher
+    OutgoingQueue m_queue;         ///< while there is anything, only the flusher sends
     bool m_isTransmitting = false; ///< the first packet of the queue
     bool m_isFlushed = false;
     bool m_isBelieved = false; ///< `connect` has said that there is an owner

@@ -4,7 +4,6 @@
 #include "platform/linux/PortCalls.h"
 #include "platform/linux/SealedMemory.h"
 
-#include <array>
 #include <bit>
 #include <cerrno>
 #include <cstddef>

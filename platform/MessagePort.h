@@ -72,9 +72,10 @@ public:
 
     virtual ~RemotePort() = default;
 
-    /// Sends the pieces as one message. Asynchronously: returns at once, with what the system does not take
-    /// now sent in the background; what is lost there, overdue or more than is kept, is logged once per
-    /// receiver. Synchronously: returns when the receiver has let go of the message's receipt.
+    /// Sends the pieces as one message. Asynchronously: returns at once. What the system does not take now,
+    /// and what is small and goes to a receiver that is far behind, is sent in the background; what is lost
+    /// there, overdue or more than is kept, is logged once per receiver. Synchronously: returns when the
+    /// receiver has let go of the message's receipt.
     virtual SendStatus send(std::span<const std::span<const std::byte>> pieces, bool synchronous,
                             Timeouts timeouts) = 0;
 };

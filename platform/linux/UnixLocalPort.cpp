@@ -170,6 +170,7 @@ bool UnixLocalPort::readPacket(const IncomingConnection& connection, PacketReade
     if (reading == Reading::packet && isOwn) return true;
     isOver = reading != Reading::nothing;
     const auto* const fault = reading == Reading::packet ? "sent by another process" : packet.fault;
+    reader.packet().messages.clear(); // and what they keep
     if (fault) complain(connection.peer().processID, fault);
     return false;
 }

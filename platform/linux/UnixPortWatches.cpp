@@ -27,7 +27,7 @@ private:
     void read() {
         switch (m_reader.read(m_socket.get())) {
         case Reading::packet:
-            return tell(m_reader.packet().messages.front());
+            return tell();
         case Reading::nothing:
             return;
         default:
@@ -36,7 +36,8 @@ private:
         }
     }
 
-    void tell(const IncomingMessage& copy) {
+    void tell() {
+        const auto copy = std::move(m_reader.packet().messages.front());
         const auto flags = copy.header.flags;
         if ((flags & PacketHeader::isAnswer) != 0) return m_delegate.onStatistics(copy.payload);
         const auto count = static_cast<std::uint32_t>(copy.header.sequence >> 32);

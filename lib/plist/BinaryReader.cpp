@@ -1,6 +1,7 @@
 #include "lib/base/SharedBytes.h"
 #include "lib/plist/Binary.h"
 #include "lib/plist/Document.h"
+#include "lib/plist/Pile.h"
 #include "lib/plist/Unicode.h"
 #include "lib/plist/Value.h"
 
@@ -58,8 +59,9 @@ public:
         , m_objects(std::min<std::size_t>(limits.objects, UINT32_MAX / 2))
         , m_nesting(std::min(limits.nesting, kDeepestNesting))
         , m_error(error)
-        , m_unclaimed(document.table - Document::kPrologue)
-        , m_nodes(document.objectCount) {}
+        , m_unclaimed(document.table - Document::kPrologue) {
+        m_nodes.extend(document.objectCount, {});
+    }
 
     bool run(std::uint64_t top) { return visit(top, 0); }
 
@@ -95,7 +97,9 @@ private:
         if (header.count == Header::kMalformed) return fail("an object is malformed");
         const auto start = static_cast<std::size_t>(header.payload - file);
         const std::size_t unit = unitSize(header.kind);
-        if (start > m_document.table || header.count > (m_document.table - start) / unit)
+        const std::size_t room = m_document.table - start;
+        // A count that fits is far too small for its product to wrap.
+        if (start > m_document.table || header.count > room || header.count * unit > room)
             return fail("an object is longer than the file");
         return claim(start - offset + header.count * unit) && inspectPayload(header, depth, node);
     }
@@ -129,7 +133,7 @@ private:
         std::uint16_t height = 0;
         node.height = kOpen;
         for (std::size_t i = 0; i < count; ++i) {
-            const std::uint64_t index = m_document.reference(header.payload, i);
+            const std::uint64_t index = m_document.references.at(header.payload, i);
             if (!visit(index, depth + 1)) return false;
             const Node& child = m_nodes[index];
             if (i < keys && !child.isText) return fail("a key is not a string");
@@ -147,9 +151,9 @@ private:
         case Kind::utf16:
             return 2;
         case Kind::array:
-            return m_document.referenceSize;
+            return m_document.references.size();
         case Kind::dictionary:
-            return 2 * m_document.referenceSize;
+            return 2 * m_document.references.size();
         default:
             return 1;
         }
@@ -175,7 +179,7 @@ private:
     const unsigned m_nesting;
     std::string& m_error;
     std::size_t m_unclaimed;
-    std::vector<Node> m_nodes;
+    Pile<Node, 32> m_nodes;
 };
 
 /// Why the trailer cannot be right; null and the document's layout when it can.
@@ -187,17 +191,19 @@ const char* readTrailer(Document& document, std::uint64_t& top, const Limits& li
 
     const std::size_t end = bytes.size() - Document::kTrailer;
     const std::byte* trailer = bytes.data() + end;
-    document.offsetSize = std::to_integer<std::size_t>(trailer[6]);
-    document.referenceSize = std::to_integer<std::size_t>(trailer[7]);
+    const auto offsetSize = std::to_integer<std::size_t>(trailer[6]);
+    const auto referenceSize = std::to_integer<std::size_t>(trailer[7]);
     document.objectCount = readNumber(trailer + 8, 8);
     document.table = readNumber(trailer + 24, 8);
     top = readNumber(trailer + 16, 8);
 
     const auto isWidth = [](std::size_t size) { return size >= 1 && size <= 8; };
-    if (!isWidth(document.offsetSize) || !isWidth(document.referenceSize)) return "the trailer is malformed";
+    if (!isWidth(offsetSize) || !isWidth(referenceSize)) return "the trailer is malformed";
+    document.offsets = Document::Numbers(offsetSize);
+    document.references = Document::Numbers(referenceSize);
     if (document.table < Document::kPrologue || document.table > end)
         return "the table of offsets lies outside the file";
-    if (document.objectCount > (end - document.table) / document.offsetSize)
+    if (document.objectCount > (end - document.table) / offsetSize)
         return "the table of offsets is longer than the file";
     if (document.objectCount > limits.objects) return "too many objects";
     return nullptr;

@@ -2,6 +2,7 @@
 
 #include "lib/plist/Document.h"
 #include "lib/plist/Output.h"
+#include "lib/plist/Pile.h"
 #include "lib/plist/Unicode.h"
 #include "lib/plist/Uniquer.h"
 #include "lib/plist/Value.h"
@@ -11,7 +12,6 @@
 #include <cstddef>
 #include <cstdint>
 #include <cstring>
-#include <memory_resource>
 #include <span>
 #include <string>
 #include <string_view>
@@ -35,12 +35,7 @@ public:
         : m_objectLimit(std::min<std::size_t>(limits.objects, UINT32_MAX / 2))
         , m_byteLimit(limits.bytes)
         , m_nesting(std::min(limits.nesting, kDeepestNesting))
-        , m_error(error) {
-        // Room for a small message: growing there would take as long as writing.
-        m_objects.reserve(32);
-        m_references.reserve(32);
-        m_containers.reserve(8);
-    }
+        , m_error(error) {}
 
     Encoded run(const Value& value) {
         m_out.put(std::as_bytes(std::span(std::string_view("bplist00"))));
@@ -108,13 +103,13 @@ private:
     /// A container that was met before is referred to again. None can hold itself: values do not change.
     bool addContainer(const Value& value, unsigned depth, Index& index) {
         if (depth == m_nesting) return fail("nested too deeply");
+        if (Access::isAlone(value)) return addContents(value, depth, index);
         const auto visited = m_visited;
         const auto [place, isNew] = placeOf(Access::identity(value), 0);
         if (!isNew) return referAgain(m_places[place], depth, index);
         const auto deepest = std::exchange(m_deepest, depth);
-        index = newObject({});
-        m_places[place].object = index;
         if (!addContents(value, depth, index)) return false;
+        m_places[place].object = index;
         m_places[place].expanded = m_visited - visited;
         m_places[place].height = m_deepest - depth;
         m_deepest = std::max(m_deepest, deepest);
@@ -127,13 +122,15 @@ private:
         return m_deepest < m_nesting ? count(place.expanded) : fail("nested too deeply");
     }
 
-    bool addContents(const Value& value, unsigned depth, Index index) {
+    bool addContents(const Value& value, unsigned depth, Index& index) {
+        index = newObject({});
+        m_deepest = std::max(m_deepest, depth);
         const std::size_t size = value.size();
         const bool isDictionary = value.isDictionary();
         const std::size_t keys = isDictionary ? size : 0;
         std::size_t at = m_references.size();
-        m_containers.push_back({isDictionary ? Kind::dictionary : Kind::array, index, size, keys + size, at});
-        m_references.resize(at + keys + size);
+        m_containers.push({isDictionary ? Kind::dictionary : Kind::array, index, size, keys + size, at});
+        m_references.extend(keys + size, 0);
 
         if (!count(keys)) return false;
         for (std::size_t i = 0; i < keys; ++i)
@@ -149,58 +146,61 @@ private:
 
     bool addText(std::string_view text, Index& index) {
         if (!count(weightOfText(text.size()))) return false;
+        const std::size_t mark = m_out.mark();
         const auto bytes = std::as_bytes(std::span(text));
         if (unicode::isASCII(bytes)) {
-            index = addLeaf(Token().putHead(Kind::ascii, bytes.size()), bytes);
-            return true;
+            m_out.putHead(Kind::ascii, bytes.size()).put(bytes);
+        } else {
+            m_units.clear();
+            while (!text.empty())
+                unicode::appendUTF16(m_units, unicode::takeUTF8(text));
+            m_out.putHead(Kind::utf16, m_units.size() / 2).put(m_units);
         }
-        m_units.clear();
-        while (!text.empty())
-            unicode::appendUTF16(m_units, unicode::takeUTF8(text));
-        index = addLeaf(Token().putHead(Kind::utf16, m_units.size() / 2), m_units);
+        index = leafSince(mark);
         return true;
     }
 
     Index addNumber(const Value& value) {
-        Token token;
+        const std::size_t mark = m_out.mark();
         switch (value.type()) {
         case Type::boolean:
-            token.put(value.boolValue() ? 0x09 : 0x08, 1);
+            m_out.putNumber(value.boolValue() ? 0x09 : 0x08, 1);
             break;
         case Type::real:
-            token.put(0x23, 1).put(std::bit_cast<std::uint64_t>(value.doubleValue()), 8);
+            m_out.putNumber(0x23, 1).putNumber(std::bit_cast<std::uint64_t>(value.doubleValue()), 8);
             break;
         case Type::date:
-            token.put(0x33, 1).put(std::bit_cast<std::uint64_t>(value.dateValue().secondsSince2001), 8);
+            m_out.putNumber(0x33, 1).putNumber(
+                std::bit_cast<std::uint64_t>(value.dateValue().secondsSince2001), 8);
             break;
         default:
             if (Access::isNegative(value))
-                token.put(0x13, 1).put(value.unsignedLongLongValue(), 8);
+                m_out.putNumber(0x13, 1).putNumber(value.unsignedLongLongValue(), 8);
             else
-                token.putInteger(value.unsignedLongLongValue());
+                m_out.putInteger(value.unsignedLongLongValue());
         }
-        return addLeaf(Token(), token.bytes());
+        return leafSince(mark);
     }
 
     Index addData(std::span<const std::byte> bytes) {
-        return bytes.size() < kPieceSize ? addLeaf(headOfData(bytes.size()), bytes) : addPiece(bytes);
+        if (bytes.size() >= kPieceSize) return addPiece(bytes);
+        const std::size_t mark = m_out.mark();
+        m_out.putHead(Kind::data, bytes.size()).put(bytes);
+        return leafSince(mark);
     }
 
-    /// Puts head and content, unless the like of them has been put before.
-    Index addLeaf(const Token& token, std::span<const std::byte> content) {
-        const auto head = token.bytes();
-        const std::size_t size = head.size() + content.size();
+    /// What was put last, from `mark` on. If the like of it was put before, that, and it is taken back.
+    Index leafSince(std::size_t mark) {
+        const std::span<const std::byte> leaf(m_out.at(mark), m_out.mark() - mark);
         const auto isSame = [&](Index known) {
             // The head tells the size, so whatever starts alike is alike.
-            const std::size_t mark = m_objects[known].mark;
-            return m_out.mark() - mark >= size && isAt(m_out.at(mark), head) &&
-                   isAt(m_out.at(mark) + head.size(), content);
+            const std::size_t other = m_objects[known].mark;
+            return mark - other >= leaf.size() && std::memcmp(m_out.at(other), leaf.data(), leaf.size()) == 0;
         };
-        const Index known = m_leaves.findOrAdd(hashOf(content), nextObject(), Uniquer::kForEver, isSame);
-        if (known != Uniquer::kNone) return known;
-        const Index index = newObject({m_out.size(), m_out.mark()});
-        store(store(m_out.extend(size), head), content);
-        return index;
+        const Index known = m_leaves.findOrAdd(m_hash.of(leaf), nextObject(), Uniquer::kForEver, isSame);
+        if (known == Uniquer::kNone) return newObject({m_out.size() - leaf.size(), mark});
+        m_out.truncate(mark);
+        return known;
     }
 
     /// The same for data that is pointed at.
@@ -217,22 +217,20 @@ private:
             const Place& other = m_places[known];
             return other.size == bytes.size() && std::memcmp(other.start, bytes.data(), bytes.size()) == 0;
         };
-        const Index known = m_contents.findOrAdd(sampledHashOf(bytes), place, kPatience, isSame);
+        const Index known = m_contents.findOrAdd(m_hash.ofSamples(bytes), place, kPatience, isSame);
         if (known != Uniquer::kNone) return m_places[known].object;
         m_places[place].object = newObject({});
         if (bytes.size() < kLargeData)
             writePiece(m_places[place]);
         else
-            m_large.push_back(place);
+            m_large.push(place);
         return m_places[place].object;
     }
 
-    static Token headOfData(std::size_t size) { return Token().putHead(Kind::data, size); }
-
     void writePiece(const Place& place) {
         m_objects[place.object].offset = m_out.size();
-        m_out.put(headOfData(place.size).bytes());
-        m_out.putElsewhere({static_cast<const std::byte*>(place.start), place.size});
+        m_out.putHead(Kind::data, place.size)
+            .putElsewhere({static_cast<const std::byte*>(place.start), place.size});
     }
 
     /// Where it is in `m_places`, and whether only now.
@@ -241,19 +239,15 @@ private:
             return m_places[known].start == start && m_places[known].size == size;
         };
         const auto next = static_cast<Index>(m_places.size());
-        const Index known = m_knownPlaces.findOrAdd(hashOf(start, size), next, Uniquer::kForEver, isThere);
+        const Index known = m_knownPlaces.findOrAdd(m_hash.of(start, size), next, Uniquer::kForEver, isThere);
         if (known != Uniquer::kNone) return {known, false};
-        m_places.push_back({start, size, 0});
+        m_places.push({start, size, 0});
         return {next, true};
-    }
-
-    static bool isAt(const std::byte* place, std::span<const std::byte> bytes) {
-        return bytes.empty() || std::memcmp(place, bytes.data(), bytes.size()) == 0;
     }
 
     Index nextObject() const { return static_cast<Index>(m_objects.size()); }
     Index newObject(const Object& object) {
-        m_objects.push_back(object);
+        m_objects.push(object);
         return static_cast<Index>(m_objects.size() - 1);
     }
 
@@ -261,7 +255,7 @@ private:
         const std::size_t width = referenceSize();
         for (const Container& container : m_containers) {
             m_objects[container.object].offset = m_out.size();
-            m_out.put(Token().putHead(container.kind, container.size).bytes());
+            m_out.putHead(container.kind, container.size);
             std::byte* to = m_out.extend(container.references * width);
             for (std::size_t i = 0; i < container.references; ++i)
                 to = storeNumber(to, m_references[container.first + i], width);
@@ -287,20 +281,18 @@ private:
     const std::size_t m_byteLimit;
     const unsigned m_nesting;
     std::string& m_error;
+    const Hash m_hash;
     Output m_out{512};
     std::string m_scratch;
     std::vector<std::byte> m_units;
-    std::byte m_room[4096]; ///< a small message needs no other memory
-    std::pmr::monotonic_buffer_resource m_memory{m_room, sizeof m_room};
-    std::pmr::vector<Object> m_objects{&m_memory};
-    std::pmr::vector<Container> m_containers{&m_memory};
-    std::pmr::vector<Index> m_references{
-        &m_memory}; ///< of all containers; of dictionaries the keys, then the values
-    std::pmr::vector<Place> m_places{&m_memory};
-    std::pmr::vector<Index> m_large{&m_memory}; ///< places of data that comes last
-    Uniquer m_leaves{m_memory};
-    Uniquer m_knownPlaces{m_memory};
-    Uniquer m_contents{m_memory};
+    Pile<Object, 32> m_objects;
+    Pile<Container, 8> m_containers;
+    Pile<Index, 32> m_references; ///< of all containers; of dictionaries the keys, then the values
+    Pile<Place, 8> m_places;
+    Pile<Index, 8> m_large; ///< places of data that comes last
+    Uniquer m_leaves;
+    Uniquer m_knownPlaces;
+    Uniquer m_contents;
     std::size_t m_visited = 0;
     unsigned m_deepest = 0; ///< container in the one that is being added
 };

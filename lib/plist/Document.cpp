@@ -33,24 +33,11 @@ std::size_t fixedSize(Kind kind, unsigned low) {
     }
 }
 
-bool isCounted(Kind kind) {
-    return kind == Kind::data || kind == Kind::ascii || kind == Kind::utf16 || kind == Kind::array ||
-           kind == Kind::dictionary;
-}
-
 } // namespace
 
-Header headerAt(const std::byte* object) {
-    const auto first = std::to_integer<unsigned>(*object);
-    const auto kind = static_cast<Kind>(first >> 4);
-    const unsigned low = first & 0xF;
-    if (!isCounted(kind)) return {kind, fixedSize(kind, low), object + 1, low == 9};
-    if (low < 0xF) return {kind, low, object + 1, false};
-
-    const auto extension = std::to_integer<unsigned>(object[1]);
-    const std::size_t width = std::size_t{1} << (extension & 0x3);
-    const bool isNumber = extension >> 2 == static_cast<unsigned>(Kind::integer) << 2;
-    return {kind, isNumber ? readNumber(object + 2, width) : Header::kMalformed, object + 2 + width, false};
+Header headerOfFixedSize(const std::byte* object) {
+    const auto low = std::to_integer<unsigned>(*object & std::byte{0xF});
+    return {kindAt(object), fixedSize(kindAt(object), low), object + 1, low == 9};
 }
 
 Value Access::make(const std::shared_ptr<const Document>& document, const std::byte* object) {
@@ -100,6 +87,13 @@ const void* Access::identity(const Value& container) {
     return view ? view->object : nullptr;
 }
 
+bool Access::isAlone(const Value& container) {
+    if (const auto* entries = std::get_if<std::shared_ptr<const Dictionary>>(&container.m_content))
+        return entries->use_count() == 1;
+    const auto* array = std::get_if<std::shared_ptr<const Array>>(&container.m_content);
+    return array && array->use_count() == 1;
+}
+
 void Access::fetchAhead(const Array& array, std::size_t index) {
     constexpr std::size_t kFar = 4, kNear = 2;
     if (array.size() - index > kFar) __builtin_prefetch(identity(array[index + kFar]));
@@ -123,7 +117,7 @@ std::string_view Access::keyAt(const Value& dictionary, std::size_t index, std::
     if (const auto* owned = std::get_if<std::shared_ptr<const Dictionary>>(&dictionary.m_content))
         return (*owned)->entries()[index].first;
     const View& view = std::get<View>(dictionary.m_content);
-    return text(headerAt(view.document->child(headerAt(view.object).payload, index)), scratch);
+    return text(headerAt(view.document->child(headerAt(view.object), index)), scratch);
 }
 
 } // namespace plist

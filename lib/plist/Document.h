@@ -30,13 +30,18 @@ enum class Kind : std::uint8_t {
 /// Data of this size or more is written last, and not touched while a document is read.
 inline constexpr std::size_t kLargeData = std::size_t{32} << 10;
 
+/// 8 bytes, big-endian.
+inline std::uint64_t readWord(const std::byte* bytes) {
+    std::uint64_t word = 0;
+    std::memcpy(&word, bytes, sizeof word);
+    if constexpr (std::endian::native == std::endian::little) word = __builtin_bswap64(word);
+    return word;
+}
+
 /// Big-endian, of 1 to 8 bytes. Loads 8 whatever the size: wherever a number of a document stands, at least
 /// the trailer follows.
 inline std::uint64_t readNumber(const std::byte* bytes, std::size_t size) {
-    std::uint64_t number = 0;
-    std::memcpy(&number, bytes, sizeof number);
-    if constexpr (std::endian::native == std::endian::little) number = __builtin_bswap64(number);
-    return number >> (64 - 8 * size);
+    return readWord(bytes) >> (64 - 8 * size);
 }
 
 /// An object's first bytes, taken apart.
@@ -55,8 +60,28 @@ struct Header {
     std::string_view ascii() const { return {reinterpret_cast<const char*>(payload), count}; }
 };
 
+inline Kind kindAt(const std::byte* object) {
+    return static_cast<Kind>(*object >> 4);
+}
+
+/// Of an object whose first byte says how long it is.
+Header headerOfFixedSize(const std::byte* object);
+
 /// Looks at no more than 10 bytes, so it is safe on any byte in front of a document's trailer.
-Header headerAt(const std::byte* object);
+inline Header headerAt(const std::byte* object) {
+    const Kind kind = kindAt(object);
+    const auto low = std::to_integer<std::size_t>(*object & std::byte{0xF});
+    constexpr auto bit = [](Kind each) { return 1u << static_cast<unsigned>(each); };
+    constexpr auto counted =
+        bit(Kind::data) | bit(Kind::ascii) | bit(Kind::utf16) | bit(Kind::array) | bit(Kind::dictionary);
+    if ((counted & bit(kind)) == 0) return headerOfFixedSize(object);
+    if (low < 0xF) return {kind, low, object + 1, false};
+
+    const auto extension = std::to_integer<unsigned>(object[1]);
+    const std::size_t width = std::size_t{1} << (extension & 0x3);
+    const bool isNumber = extension >> 2 == static_cast<unsigned>(Kind::integer) << 2;
+    return {kind, isNumber ? readNumber(object + 2, width) : Header::kMalformed, object + 2 + width, false};
+}
 
 /// What a string adds to the number of objects.
 inline std::size_t weightOfText(std::size_t bytes) {
@@ -69,20 +94,33 @@ public:
     static constexpr std::size_t kPrologue = 8; ///< "bplist00"
     static constexpr std::size_t kTrailer = 32;
 
+    /// A table of numbers of one size.
+    class Numbers {
+    public:
+        Numbers() = default;
+        /// Of 1 to 8 bytes each.
+        explicit Numbers(std::size_t size)
+            : m_size(size)
+            , m_shift(static_cast<unsigned>(64 - 8 * size)) {}
+        std::size_t size() const { return m_size; }
+        std::uint64_t at(const std::byte* start, std::size_t index) const {
+            return readWord(start + index * m_size) >> m_shift;
+        }
+
+    private:
+        std::size_t m_size = 0;
+        unsigned m_shift = 0;
+    };
+
     Data bytes;
-    std::size_t offsetSize = 0;
-    std::size_t referenceSize = 0;
+    Numbers offsets;
+    Numbers references;
     std::size_t objectCount = 0;
     std::size_t table = 0; ///< where the offsets start
 
-    std::uint64_t offsetOf(std::uint64_t index) const {
-        return readNumber(bytes.data() + table + index * offsetSize, offsetSize);
-    }
-    std::uint64_t reference(const std::byte* references, std::size_t i) const {
-        return readNumber(references + i * referenceSize, referenceSize);
-    }
-    const std::byte* child(const std::byte* references, std::size_t i) const {
-        return bytes.data() + offsetOf(reference(references, i));
+    std::uint64_t offsetOf(std::uint64_t index) const { return offsets.at(bytes.data() + table, index); }
+    const std::byte* child(const Header& container, std::size_t i) const {
+        return bytes.data() + offsetOf(references.at(container.payload, i));
     }
 };
 
@@ -101,6 +139,8 @@ struct Access {
     static std::string_view keyAt(const Value& dictionary, std::size_t index, std::string& scratch);
     /// Tells a container from all others of the same time; null for other types.
     static const void* identity(const Value& container);
+    /// Whether nothing else refers to this container.
+    static bool isAlone(const Value& container);
     /// What data holds, empty for other types.
     static std::span<const std::byte> bytes(const Value& value);
     static bool isNegative(const Value& integer) { return std::get<Integer>(integer.m_content).negative; }

@@ -6,6 +6,7 @@
 
 #include <algorithm>
 #include <cstddef>
+#include <cstring>
 #include <memory>
 #include <span>
 #include <utility>
@@ -15,21 +16,16 @@ namespace plist {
 
 void Output::grow(std::size_t size) {
     m_capacity = std::max(2 * m_capacity, m_used + size);
-    auto larger = std::make_unique_for_overwrite<std::byte[]>(m_capacity);
-    store(larger.get(), {m_own.get(), m_used});
+    auto larger = std::make_shared_for_overwrite<std::byte[]>(m_capacity);
+    std::memcpy(larger.get(), m_own.get(), m_used);
     m_own = std::move(larger);
 }
 
 Encoded Output::finish(const Value& holder) && {
-    struct Kept {
-        std::unique_ptr<std::byte[]> bytes;
-        Value holder;
-    };
     Encoded encoded;
     encoded.size = size();
-    auto kept = std::make_shared<const Kept>(Kept{std::move(m_own), holder});
     encoded.pieces.reserve(2 * m_breaks.size() + 1);
-    const std::span<const std::byte> own(kept->bytes.get(), m_used);
+    const std::span<const std::byte> own(m_own.get(), m_used);
     std::size_t from = 0;
     for (const Break& each : m_breaks) {
         encoded.pieces.push_back(own.subspan(from, each.at - from));
@@ -37,7 +33,10 @@ Encoded Output::finish(const Value& holder) && {
         from = each.at;
     }
     encoded.pieces.push_back(own.subspan(from));
-    encoded.keepAlive = std::move(kept);
+    encoded.keepAlive = std::move(m_own);
+    if (!m_breaks.empty())
+        encoded.keepAlive = std::make_shared<std::pair<std::shared_ptr<const void>, Value>>(
+            std::move(encoded.keepAlive), holder);
     return encoded;
 }
 

@@ -36,21 +36,26 @@ Lead leadOf(unsigned char byte) {
     return {0, kReplacement, 0};
 }
 
+/// Whether the bytes of one word are all ASCII.
+template <class Word>
+bool isPlain(const std::byte* bytes) {
+    Word word = 0;
+    std::memcpy(&word, bytes, sizeof word);
+    return (word & static_cast<Word>(0x8080808080808080)) == 0;
+}
+
 } // namespace
 
 bool isASCII(std::span<const std::byte> bytes) {
-    constexpr std::size_t kWord = sizeof(std::uint64_t);
-    const auto isPlain = [&](std::size_t at) {
-        std::uint64_t word = 0;
-        std::memcpy(&word, bytes.data() + at, kWord);
-        return (word & 0x8080808080808080) == 0;
-    };
-    if (bytes.size() < kWord)
-        return std::ranges::none_of(bytes,
-                                    [](std::byte each) { return (each & std::byte{0x80}) != std::byte{}; });
-    for (std::size_t at = 0; at + kWord < bytes.size(); at += kWord)
-        if (!isPlain(at)) return false;
-    return isPlain(bytes.size() - kWord);
+    const std::byte* at = bytes.data();
+    const std::byte* end = at + bytes.size();
+    if (bytes.size() >= 8) {
+        for (; end - at > 8; at += 8)
+            if (!isPlain<std::uint64_t>(at)) return false;
+        return isPlain<std::uint64_t>(end - 8);
+    }
+    if (bytes.size() >= 4) return isPlain<std::uint32_t>(at) && isPlain<std::uint32_t>(end - 4);
+    return std::ranges::all_of(bytes, [](const std::byte& each) { return isPlain<std::uint8_t>(&each); });
 }
 
 char32_t takeUTF8(std::string_view& text) {

@@ -7,11 +7,13 @@
 #include <cmath>
 #include <cstddef>
 #include <cstdint>
+#include <cstring>
 #include <initializer_list>
 #include <limits>
 #include <memory>
 #include <numeric>
 #include <optional>
+#include <span>
 #include <string>
 #include <string_view>
 #include <utility>
@@ -53,10 +55,7 @@ Type typeOf(Kind kind) {
     }
 }
 
-bool textEquals(const Header& header, std::string_view text) {
-    if (header.kind == Kind::ascii) return header.ascii() == text;
-    if (header.kind != Kind::utf16) return false;
-    auto units = header.units();
+bool utf16Equals(std::span<const std::byte> units, std::string_view text) {
     while (!units.empty() && !text.empty()) {
         // A real U+FFFD and malformed text would meet here as one: the length of what was taken tells them
         // apart.
@@ -67,6 +66,33 @@ bool textEquals(const Header& header, std::string_view text) {
     }
     return units.empty() && text.empty();
 }
+
+bool textEquals(const std::byte* object, std::string_view text) {
+    const Header header = headerAt(object);
+    if (header.kind == Kind::ascii)
+        return header.count == text.size() && std::memcmp(header.payload, text.data(), text.size()) == 0;
+    return header.kind == Kind::utf16 && utf16Equals(header.units(), text);
+}
+
+/// Compares what most keys are: ASCII of less than 15 bytes, whose size stands in the first byte.
+class ShortText {
+public:
+    explicit ShortText(std::string_view text)
+        : m_text(text)
+        , m_head(static_cast<std::byte>(headOf | std::min<std::size_t>(text.size(), 0xF))) {}
+
+    bool canTell(const std::byte* object) const {
+        return *object >= std::byte{headOf} && *object < std::byte{headOf | 0xF};
+    }
+    bool is(const std::byte* object) const {
+        return *object == m_head && std::memcmp(object + 1, m_text.data(), m_text.size()) == 0;
+    }
+
+private:
+    static constexpr unsigned headOf = static_cast<unsigned>(Kind::ascii) << 4;
+    const std::string_view m_text;
+    const std::byte m_head;
+};
 
 /// A dictionary's keys in order, each with its place.
 std::vector<std::pair<std::string, std::size_t>> sortedKeys(const Value& dictionary) {
@@ -91,13 +117,17 @@ bool dictionariesEqual(const Value& a, const Value& b) {
 
 Dictionary::Dictionary() = default;
 
-Dictionary::Dictionary(std::initializer_list<Entry> entries)
-    : Dictionary(std::vector<Entry>(entries)) {}
+Dictionary::Dictionary(std::initializer_list<Field> fields) {
+    m_entries.reserve(fields.size());
+    for (const Field& field : fields)
+        set(field.key, std::move(field.value));
+}
 
 Dictionary::Dictionary(std::vector<Entry> entries)
     : m_entries(std::move(entries)) {
     const auto isRepeated = [&](const Entry& entry) {
-        return std::ranges::count(m_entries, entry.first, &Entry::first) > 1;
+        return std::any_of(&entry + 1, std::to_address(m_entries.cend()),
+                           [&](const Entry& later) { return later.first == entry.first; });
     };
     const auto isNil = [](const Entry& entry) { return entry.second.isNil(); };
     constexpr std::size_t few = 8; // compared faster than sorted
@@ -117,14 +147,14 @@ Dictionary::Dictionary(std::vector<Entry> entries)
     std::erase_if(m_entries, isNil);
 }
 
-Dictionary& Dictionary::set(std::string key, Value value) {
+Dictionary& Dictionary::set(std::string_view key, Value value) {
     const auto found = std::ranges::find(m_entries, key, &Entry::first);
     if (value.isNil()) {
         if (found != m_entries.end()) m_entries.erase(found);
     } else if (found != m_entries.end()) {
         found->second = std::move(value);
     } else {
-        m_entries.emplace_back(std::move(key), std::move(value));
+        m_entries.emplace_back(key, std::move(value));
     }
     return *this;
 }
@@ -145,7 +175,7 @@ Value::Value(Dictionary dictionary)
     : m_content(std::make_shared<const Dictionary>(std::move(dictionary))) {}
 
 Type Value::type() const {
-    if (const auto* view = std::get_if<View>(&m_content)) return typeOf(headerAt(view->object).kind);
+    if (const auto* view = std::get_if<View>(&m_content)) return typeOf(kindAt(view->object));
     return static_cast<Type>(m_content.index());
 }
 
@@ -196,7 +226,7 @@ std::string Value::stringOr(std::string_view fallback) const {
 }
 
 bool Value::equalsString(std::string_view text) const {
-    if (const auto* view = std::get_if<View>(&m_content)) return textEquals(headerAt(view->object), text);
+    if (const auto* view = std::get_if<View>(&m_content)) return textEquals(view->object, text);
     const auto* owned = std::get_if<std::shared_ptr<const std::string>>(&m_content);
     return owned && **owned == text;
 }
@@ -227,7 +257,7 @@ Value Value::at(std::size_t index) const {
     const View& view = std::get<View>(m_content);
     const Header header = headerAt(view.object);
     const std::size_t values = header.kind == Kind::dictionary ? header.count : 0;
-    return Access::make(view.document, view.document->child(header.payload, values + index));
+    return Access::make(view.document, view.document->child(header, values + index));
 }
 
 std::string Value::keyAt(std::size_t index) const {
@@ -237,18 +267,20 @@ std::string Value::keyAt(std::size_t index) const {
 }
 
 Value Value::operator[](std::string_view key) const {
-    if (!isDictionary()) return {};
     if (const auto* dictionary = std::get_if<std::shared_ptr<const Dictionary>>(&m_content)) {
         const auto& entries = (*dictionary)->entries();
         const auto found = std::ranges::find(entries, key, &Dictionary::Entry::first);
         return found == entries.end() ? Value() : found->second;
     }
-    const View& view = std::get<View>(m_content);
-    const Document& document = *view.document;
-    const Header header = headerAt(view.object);
+    const auto* view = std::get_if<View>(&m_content);
+    if (!view || kindAt(view->object) != Kind::dictionary) return {};
+    const Document& document = *view->document;
+    const Header header = headerAt(view->object);
+    const ShortText shortKey(key);
     for (std::size_t i = 0; i < header.count; ++i) {
-        if (!textEquals(headerAt(document.child(header.payload, i)), key)) continue;
-        return Access::make(view.document, document.child(header.payload, header.count + i));
+        const std::byte* each = document.child(header, i);
+        if (shortKey.canTell(each) ? shortKey.is(each) : textEquals(each, key))
+            return Access::make(view->document, document.child(header, header.count + i));
     }
     return {};
 }

@@ -37,11 +37,13 @@ class Dictionary {
 public:
     using Entry = std::pair<std::string, Value>;
 
+    struct Field;
+
     Dictionary();
-    Dictionary(std::initializer_list<Entry> entries);
+    Dictionary(std::initializer_list<Field> fields);
     explicit Dictionary(
         std::vector<Entry> entries); ///< any number; of equal keys the last one's value counts
-    Dictionary& set(std::string key, Value value);
+    Dictionary& set(std::string_view key, Value value);
     std::size_t size() const;
     const std::vector<Entry>& entries() const { return m_entries; }
 
@@ -137,6 +139,12 @@ private:
                      std::shared_ptr<const Array>, std::shared_ptr<const Dictionary>, View>;
 
     Content m_content;
+};
+
+/// An entry as code spells it out. Its value is moved from.
+struct Dictionary::Field {
+    std::string_view key;
+    mutable Value value;
 };
 
 /// Valid as long as the value that it came from.

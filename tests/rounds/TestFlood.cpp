@@ -2,15 +2,15 @@
 #include "lib/ipc/KXIPCNames.h"
 #include "lib/ipc/KXIPCSend.h"
 #include "lib/plist/Binary.h"
-#include "lib/plist/Output.h"
 #include "platform/linux/Backlog.h"
 #include "tests/rounds/Program.h"
 #include "tests/support/MappedMessages.h"
 #include "tests/support/ScratchHome.h"
 
 #include <algorithm>
-#include <array>
 #include <atomic>
+#include <cstring>
+#include <endian.h>
 #include <thread>
 #include <vector>
 
@@ -57,13 +57,14 @@ void flood(const std::string& directory, State& state, const Kind& kind) {
     const auto envelope = KXIPCEnvelope(message, *program.processes.currentProcess(), first, false);
     const auto written = plist::WriteBinary(envelope, error).joined();
     std::vector<std::byte> bytes(written.span().begin(), written.span().end());
-    std::array<std::byte, sizeof first> number;
-    plist::storeNumber(number.data(), first, sizeof first);
-    auto* const place = &*std::search(bytes.begin(), bytes.end(), number.begin(), number.end());
+    std::uint32_t number = htobe32(first);
+    const auto digits = std::as_bytes(std::span(&number, 1));
+    auto* const place = &*std::search(bytes.begin(), bytes.end(), digits.begin(), digits.end());
     const std::span<const std::byte> pieces[] = {bytes};
     const auto port = program.system.ports().connect(KX_IPC_ServerPortName());
     for (std::uint32_t i = 1; i <= kind.count; ++i) {
-        plist::storeNumber(place, first + i, sizeof first);
+        number = htobe32(first + i);
+        std::memcpy(place, &number, sizeof number);
         port->send(pieces, i % kind.unanswered == 0 || i == kind.count,
                    {std::chrono::hours(1), std::chrono::hours(1)});
     }

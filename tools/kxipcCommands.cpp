@@ -95,7 +95,8 @@ void KxipcListener::stop(std::function<void()> whenStopped) {
 }
 
 void KxipcListener::print(const KXNotification& notification) {
-    const auto* object = std::any_cast<std::optional<std::string>>(&notification.object);
-    const KXIPCMessage message(notification.name, object ? *object : std::nullopt, KXUserInfo(notification));
+    const auto* object = std::any_cast<std::string>(&notification.object);
+    const KXIPCMessage message(notification.name, object ? std::optional(*object) : std::nullopt,
+                               KXUserInfo(notification));
     m_output << message.description() << std::flush;
 }

@@ -10,6 +10,7 @@
 #include "platform/ProcessTable.h"
 
 #include <algorithm>
+#include <any>
 #include <cstddef>
 #include <cstdint>
 #include <functional>
@@ -37,32 +38,40 @@ KXIPCCommon::Observer* KXIPCCommon::find(const void* token) {
     return found == m_places.end() ? nullptr : &m_observerTable[found->second];
 }
 
+KXIPCObserverEntry::Array& KXIPCCommon::Observer::changeableEntries() {
+    if (entries.use_count() > 1) entries = std::make_shared<KXIPCObserverEntry::Array>(*entries);
+    return *entries;
+}
+
 void KXIPCCommon::addEntries(const KXIPCObserverEntry::Array& entries, const void* observer) {
     auto* known = find(observer);
     if (!known) {
         m_places.emplace(observer, m_observerTable.size());
-        known = &m_observerTable.emplace_back(Observer{observer, {}});
+        known =
+            &m_observerTable.emplace_back(Observer{observer, std::make_shared<KXIPCObserverEntry::Array>()});
     }
-    known->entries.insert(known->entries.end(), entries.begin(), entries.end());
+    auto& all = known->changeableEntries();
+    all.insert(all.end(), entries.begin(), entries.end());
 }
 
 void KXIPCCommon::removeEntries(const KXIPCObserverEntry::Array& entries, const void* observer) {
     auto* known = find(observer);
     if (!known) return;
     // Removing each entry's matches at once would shift the indexes of the next; the empty list stays.
-    std::vector<bool> removed(known->entries.size());
+    auto& all = known->changeableEntries();
+    std::vector<bool> removed(all.size());
     for (const auto& entry : entries)
-        for (const auto index : entry->matchesInObserverArray(known->entries))
+        for (const auto index : entry->matchesInObserverArray(all))
             removed[index] = true;
     std::size_t index = 0;
-    std::erase_if(known->entries, [&](const auto&) { return removed[index++]; });
+    std::erase_if(all, [&](const auto&) { return removed[index++]; });
     ++m_removals;
 }
 
 KXIPCObserverEntry::Array KXIPCCommon::allEntries() const {
     KXIPCObserverEntry::Array all;
     for (const auto& observer : m_observerTable)
-        all.insert(all.end(), observer.entries.begin(), observer.entries.end());
+        all.insert(all.end(), observer.entries->begin(), observer.entries->end());
     return all;
 }
 
@@ -76,31 +85,28 @@ void KXIPCCommon::postMessage(const KXIPCMessage& message, bool) {
 }
 
 bool KXIPCCommon::dispatchMessageToLocalListeners(const KXIPCMessage& message) {
-    std::vector<const void*> tokens;
-    tokens.reserve(m_observerTable.size());
-    for (const auto& observer : m_observerTable)
-        tokens.push_back(observer.token);
-    return std::ranges::all_of(tokens, [&](const auto* token) { return dispatch(message, token); });
+    // Those that come meanwhile are not asked; a table that was emptied has none left.
+    const std::size_t count = m_observerTable.size();
+    for (std::size_t i = 0; i < std::min(count, m_observerTable.size()); ++i)
+        if (!dispatch(message, m_observerTable[i])) return false;
+    return true;
 }
 
 /// Whether this object is still there afterwards.
-bool KXIPCCommon::dispatch(const KXIPCMessage& message, const void* token) {
-    const auto* observer = find(token);
-    if (!observer) return true;
-    KXIPCObserverEntry::Array matching;
-    for (const auto index : message.matchesInObserverArray(observer->entries))
-        matching.push_back(observer->entries[index]);
-
+bool KXIPCCommon::dispatch(const KXIPCMessage& message, const Observer& observer) {
+    const auto* token = observer.token;
+    const auto entries = observer.entries;
     const auto removalsBefore = m_removals;
     const auto isStillThere = [&](const KXIPCObserverEntry::Pointer& entry) {
         if (m_removals == removalsBefore) return true;
         const auto* now = find(token);
-        return now && std::ranges::find(now->entries, entry) != now->entries.end();
+        return now && std::ranges::find(*now->entries, entry) != now->entries->end();
     };
     const std::weak_ptr alive = m_alive;
-    for (const auto& entry : matching) {
-        if (entry->selector() && isStillThere(entry))
-            entry->selector()({*message.name(), message.object(), message.userInfo()});
+    for (const auto& entry : *entries) {
+        if (!message.matches(*entry) || !entry->selector() || !isStillThere(entry)) continue;
+        entry->selector()({*message.name(), message.object() ? std::any(*message.object()) : std::any(),
+                           message.userInfo()});
         if (alive.expired()) return false;
     }
     return true;

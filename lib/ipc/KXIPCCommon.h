@@ -62,10 +62,12 @@ protected:
 private:
     struct Observer {
         const void* token;
-        KXIPCObserverEntry::Array entries;
+        std::shared_ptr<KXIPCObserverEntry::Array> entries; ///< shared with a dispatch under way
+
+        KXIPCObserverEntry::Array& changeableEntries();
     };
     Observer* find(const void* token);
-    bool dispatch(const KXIPCMessage& message, const void* token);
+    bool dispatch(const KXIPCMessage& message, const Observer& observer);
     void forgetEndedSenders();
 
     KXIPCContext& m_context;

@@ -8,7 +8,6 @@
 
 #include <algorithm>
 #include <cstdint>
-#include <string>
 #include <string_view>
 
 namespace {
@@ -38,17 +37,14 @@ plist::Value KXIPCEnvelope(const KXIPCMessage& message, platform::ProcessSerialN
                              {"synchronous", synchronous}};
 }
 
-std::string KXIPCEnvelopeError(const plist::Value& envelope) {
-    if (!envelope.isDictionary()) return "the envelope is no dictionary";
-    if (!envelope["message"].isDictionary()) return "the envelope holds no message";
-    if (envelope["psnKey"].type() != plist::Type::integer) return "the envelope names no sender";
-    return {};
-}
-
-bool KXIPCEnvelopeIsFrom(const plist::Value& envelope, const platform::PortPeer& sender) {
-    if (!names(envelope["psnKey"], sender)) return false;
+KXIPCEnvelopeFault KXIPCCheckEnvelope(const plist::Value& envelope, const platform::PortPeer& sender) {
+    if (!envelope.isDictionary()) return {"the envelope is no dictionary"};
     const auto message = envelope["message"];
-    if (!isControlMessage(message)) return true;
+    if (!message.isDictionary()) return {"the envelope holds no message"};
+    const auto named = envelope["psnKey"];
+    if (named.type() != plist::Type::integer) return {"the envelope names no sender"};
+    if (!names(named, sender)) return {.isForged = true};
+    if (!isControlMessage(message)) return {};
     const auto number = message["userInfo"][KX_IPC_PARAM_PSN];
-    return number.isNil() || names(number, sender);
+    return {.isForged = !number.isNil() && !names(number, sender)};
 }

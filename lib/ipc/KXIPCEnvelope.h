@@ -4,7 +4,6 @@
 #include "platform/MessagePort.h"
 
 #include <cstdint>
-#include <string>
 
 /// The dictionary around a message on the wire: "message", "psnKey", "messageID", "synchronous". Pure
 /// functions, for any thread.
@@ -12,10 +11,13 @@
 plist::Value KXIPCEnvelope(const KXIPCMessage& message, platform::ProcessSerialNumber sender,
                            std::int32_t messageID, bool synchronous);
 
-/// Why this cannot be dispatched; empty when it can.
-std::string KXIPCEnvelopeError(const plist::Value& envelope);
+/// What keeps an envelope from being dispatched.
+struct KXIPCEnvelopeFault {
+    const char* error = nullptr; ///< why it is no envelope; null when it is one
+    bool isForged = false;       ///< it, or a control message in it, names another process than sent it
 
-/// Whether the process that the envelope names, and the one that a control message in it names, is the one
-/// that sent it. For an envelope without error. Of a sender that has ended, its process id alone must be
-/// right.
-bool KXIPCEnvelopeIsFrom(const plist::Value& envelope, const platform::PortPeer& sender);
+    bool any() const { return error || isForged; }
+};
+
+/// Of a sender that has ended, its process id alone must be right.
+KXIPCEnvelopeFault KXIPCCheckEnvelope(const plist::Value& envelope, const platform::PortPeer& sender);

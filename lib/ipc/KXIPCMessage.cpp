@@ -27,15 +27,16 @@ plist::Value KXIPCMessage::propertyList() const {
     return plist::Dictionary{{"name", text(m_name)}, {"object", text(m_object)}, {"userInfo", m_userInfo}};
 }
 
+bool KXIPCMessage::matches(const KXIPCObserverEntry& entry) const {
+    return KXIsEqual(m_name, entry.name()) && (!entry.object() || KXIsEqual(entry.object(), m_object));
+}
+
 std::vector<std::size_t>
 KXIPCMessage::matchesInObserverArray(const KXIPCObserverEntry::Array& entries) const {
-    std::vector<std::size_t> matches;
-    for (std::size_t index = 0; index < entries.size(); ++index) {
-        const auto& entry = *entries[index];
-        const bool objectMatches = !entry.object() || KXIsEqual(entry.object(), m_object);
-        if (KXIsEqual(m_name, entry.name()) && objectMatches) matches.push_back(index);
-    }
-    return matches;
+    std::vector<std::size_t> indexes;
+    for (std::size_t index = 0; index < entries.size(); ++index)
+        if (matches(*entries[index])) indexes.push_back(index);
+    return indexes;
 }
 
 std::string KXIPCMessage::description() const {

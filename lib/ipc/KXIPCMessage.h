@@ -21,8 +21,9 @@ public:
     const plist::Value& userInfo() const { return m_userInfo; } ///< a dictionary or nil
 
     plist::Value propertyList() const;
-    /// Indexes, ascending, of the entries that this message matches: same name, and the entry's object absent
-    /// or equal to the message's.
+    /// Same name, and the entry's object absent or equal to the message's.
+    bool matches(const KXIPCObserverEntry& entry) const;
+    /// Indexes, ascending, of the entries that this message matches.
     std::vector<std::size_t> matchesInObserverArray(const KXIPCObserverEntry::Array& entries) const;
     std::string description() const;
 

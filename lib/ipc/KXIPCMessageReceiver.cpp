@@ -91,17 +91,18 @@ private:
         constexpr auto routine = "WorkerThreadOnMessageReceived";
         std::string error;
         auto envelope = plist::Parse(arrival.bytes, error, limits, arrival.peek);
-        if (error.empty()) error = KXIPCEnvelopeError(envelope);
-        if (error.empty() && KXIPCEnvelopeIsFrom(envelope, arrival.sender)) {
+        const auto fault =
+            error.empty() ? KXIPCCheckEnvelope(envelope, arrival.sender) : KXIPCEnvelopeFault{error.c_str()};
+        if (!fault.any()) {
             group.push_back({std::move(envelope), std::move(arrival.receipt)});
             return;
         }
         if (!m_ports.mayLogAbout(std::to_string(arrival.sender.processID))) return;
-        if (error.empty())
+        if (fault.isForged)
             Log("IPC: %s: dropping message that process %d sent in another's name\n", routine,
                 arrival.sender.processID);
         else
-            Log("IPC: %s: unable to parse remote message. Error: %s\n", routine, error.c_str());
+            Log("IPC: %s: unable to parse remote message. Error: %s\n", routine, fault.error);
     }
 
     void forwardEnd() {
@@ -130,6 +131,7 @@ private:
     void deliver() {
         {
             const std::lock_guard lock(m_mutex);
+            if (m_ready.empty()) m_ready.swap(m_inbox);
             std::ranges::move(m_inbox, std::back_inserter(m_ready));
             m_inbox.clear();
             m_isPosted = m_ready.size() > 1;
@@ -163,7 +165,7 @@ private:
     bool m_hasTerminated = false;
     std::deque<Delivery> m_ready; ///< main thread
     std::mutex m_mutex;           ///< guards what follows
-    std::vector<Delivery> m_inbox;
+    std::deque<Delivery> m_inbox;
     bool m_isPosted = false; ///< a task that will look into the inbox
 };
 

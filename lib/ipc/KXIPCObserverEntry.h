@@ -10,7 +10,8 @@
 #include <string>
 #include <vector>
 
-/// What an observer of messages gets: `object` holds a std::optional<std::string>, `userInfo` a plist::Value.
+/// What an observer of messages gets: `object` holds a std::string, if there is one, `userInfo` a
+/// plist::Value.
 const plist::Value& KXUserInfo(const KXNotification& notification);
 
 /// One row of an observer's table: which messages, and what to call. Immutable; compared by identity alone.

@@ -13,6 +13,7 @@
 #include "platform/DistributedNotificationCenter.h"
 #include "platform/MessagePort.h"
 
+#include <algorithm>
 #include <cstddef>
 #include <cstdint>
 #include <functional>
@@ -82,7 +83,8 @@ void KXIPCServer::postMessage(const KXIPCMessage& message, bool synchronously) {
 std::vector<KXProcess::Pointer> KXIPCServer::clientsForMessage(const KXIPCMessage& message) const {
     std::vector<KXProcess::Pointer> clients;
     for (const auto& [number, client] : m_clients)
-        if (!message.matchesInObserverArray(client.entries).empty()) clients.push_back(client.process);
+        if (std::ranges::any_of(client.entries, [&](const auto& entry) { return message.matches(*entry); }))
+            clients.push_back(client.process);
     return clients;
 }
 

@@ -75,7 +75,7 @@ TEST_F(KXIPCCommonTest, CallsEveryMatchingEntryInOrder) {
     EXPECT_THAT(post(), ElementsAre("twice", "twice", "b"));
     EXPECT_THAT(post("o"), ElementsAre("twice", "o", "twice", "b"));
     EXPECT_EQ(last.name, "n");
-    EXPECT_EQ(std::any_cast<std::optional<std::string>>(last.object), "o");
+    EXPECT_EQ(std::any_cast<std::string>(last.object), "o");
     EXPECT_EQ(KXUserInfo(last), plist::Value(plist::Dictionary{{"key", 1}}));
     common.removeEntries(entry("", "n", "o"), &a);
     EXPECT_THAT(post("o"), ElementsAre("twice", "twice", "b"));

@@ -48,16 +48,17 @@ TEST(KXIPCMessage, WildcardIsTheEntrysForAMessageAndTheGivenOnesForAnEntry) {
 
 TEST(KXIPCEnvelope, IsCheckedForItsFormAndForItsSender) {
     const Value message = Dictionary();
-    EXPECT_EQ(KXIPCEnvelopeError(Dictionary{{"message", message}, {"psnKey", 1}}), "");
+    EXPECT_FALSE(KXIPCCheckEnvelope(Dictionary{{"message", message}, {"psnKey", 1}}, {1, {}}).any());
     const Value wrong[] = {1, Dictionary{{"psnKey", 1}}, Dictionary{{"message", "m"}, {"psnKey", 1}},
                            Dictionary{{"message", message}},
                            Dictionary{{"message", message}, {"psnKey", true}}};
     for (const auto& envelope : wrong)
-        EXPECT_NE(KXIPCEnvelopeError(envelope), "") << envelope.description();
+        EXPECT_TRUE(KXIPCCheckEnvelope(envelope, {1, {}}).error) << envelope.description();
 
     const platform::ProcessSerialNumber self{7, 42}, reused{8, 42}, stranger{7, 43};
     const auto isFrom = [&](platform::ProcessSerialNumber named, const platform::PortPeer& sender) {
-        return KXIPCEnvelopeIsFrom(KXIPCEnvelope(KXIPCMessage("n", {}, {}), named, 1, false), sender);
+        const auto envelope = KXIPCEnvelope(KXIPCMessage("n", {}, {}), named, 1, false);
+        return !KXIPCCheckEnvelope(envelope, sender).isForged;
     };
     EXPECT_TRUE(isFrom(self, {42, self}));
     EXPECT_FALSE(isFrom(reused, {42, self}));

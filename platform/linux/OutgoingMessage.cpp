@@ -6,6 +6,7 @@
 #include "platform/linux/PortPacket.h"
 #include "platform/linux/SealedMemory.h"
 
+#include <algorithm>
 #include <array>
 #include <cerrno>
 #include <climits>
@@ -23,6 +24,8 @@
 namespace platform {
 
 Sending SendPacket(int socket, std::span<iovec> parts, const PacketMemory& memory) {
+    // The simpler call costs a tenth less.
+    const bool isOneRun = parts.size() == 1 && !memory;
     msghdr packet = {};
     packet.msg_iov = parts.data();
     packet.msg_iovlen = parts.size();
@@ -36,7 +39,10 @@ Sending SendPacket(int socket, std::span<iovec> parts, const PacketMemory& memor
         *rights = {CMSG_LEN(sizeof descriptor), SOL_SOCKET, SCM_RIGHTS};
         std::memcpy(CMSG_DATA(rights), &descriptor, sizeof descriptor);
     }
-    const auto sent = Uninterrupted([&] { return sendmsg(socket, &packet, sendFlags); });
+    const auto sent = Uninterrupted([&] {
+        return isOneRun ? ::send(socket, parts.front().iov_base, parts.front().iov_len, sendFlags)
+                        : sendmsg(socket, &packet, sendFlags);
+    });
     return sent < 0 ? SendingFromErrno() : Sending::taken;
 }
 
@@ -70,6 +76,16 @@ Sending OutgoingMessage::sendCopy(int socket, std::uint16_t flags, std::uint64_t
 }
 
 Sending OutgoingMessage::send(int socket, const PacketHeader& header) const {
+    std::array<std::byte, 1024> small;
+    const auto length = sizeof header + size() - sizeInMemory();
+    if (!m_memory && length <= small.size()) {
+        std::memcpy(small.data(), &header, sizeof header);
+        auto* end = small.data() + sizeof header;
+        for (const auto piece : m_pieces)
+            end = std::ranges::copy(piece, end).out;
+        iovec all{small.data(), length};
+        return SendPacket(socket, {&all, 1}, nullptr);
+    }
     std::array<iovec, 8> few;
     std::vector<iovec> many;
     std::vector<std::byte> joined;

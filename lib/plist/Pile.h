@@ -15,6 +15,7 @@ template <class Item, std::size_t few>
 class Pile {
 public:
     Pile() = default;
+    ~Pile() = default;
     Pile(const Pile&) = delete;
     Pile& operator=(const Pile&) = delete;
 

@@ -70,6 +70,7 @@ public:
     static constexpr unsigned kForEver = UINT32_MAX;
 
     Uniquer() = default;
+    ~Uniquer() = default;
     Uniquer(const Uniquer&) = delete;
     Uniquer& operator=(const Uniquer&) = delete;
 

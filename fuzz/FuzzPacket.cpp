@@ -76,8 +76,11 @@ void deliver(Process& process, const std::string& name, unsigned how, const std:
         peer.trySend(packet);
     peer.trySend({.bytes = RawHeader({.flags = PacketHeader::wantsAnswer})});
     // The input itself may have asked for an answer: its own, or the end, is what is waited for then.
-    for (PacketHeader answer{.sequence = 1}; answer.sequence != 0;)
+    for (PacketHeader answer{.sequence = 1}; answer.sequence != 0;) {
+        while (!peer.hasReply(1)) // what waits to be handled may keep the port from reading on
+            process.loop.turn(platform::MainLoop::Milliseconds::zero());
         if (peer.receive(&answer, sizeof answer) <= 0 || (how & 0x10) == 0) break;
+    }
 }
 
 } // namespace

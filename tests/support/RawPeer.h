@@ -77,14 +77,17 @@ public:
         return sendmsg(m_socket.get(), &message, MSG_NOSIGNAL) >= 0;
     }
 
+    bool hasReply(int milliseconds) {
+        pollfd polled{m_socket.get(), POLLIN, 0};
+        return poll(&polled, 1, milliseconds) == 1;
+    }
     /// Like recv, waiting.
     ssize_t receive(void* to, std::size_t size) { return recv(m_socket.get(), to, size, 0); }
 
     /// Waits for the end of the connection; false when an answer comes instead, or nothing.
     bool isCutOff() {
-        pollfd polled{m_socket.get(), POLLIN, 0};
         char byte = 0;
-        return poll(&polled, 1, 20'000) == 1 && recv(m_socket.get(), &byte, 1, MSG_DONTWAIT) <= 0;
+        return hasReply(20'000) && recv(m_socket.get(), &byte, 1, MSG_DONTWAIT) <= 0;
     }
 
 private:

@@ -7,7 +7,6 @@
 #include <cmath>
 #include <cstddef>
 #include <cstdint>
-#include <cstring>
 #include <initializer_list>
 #include <limits>
 #include <memory>
@@ -69,8 +68,7 @@ bool utf16Equals(std::span<const std::byte> units, std::string_view text) {
 
 bool textEquals(const std::byte* object, std::string_view text) {
     const Header header = headerAt(object);
-    if (header.kind == Kind::ascii)
-        return header.count == text.size() && std::memcmp(header.payload, text.data(), text.size()) == 0;
+    if (header.kind == Kind::ascii) return header.ascii() == text;
     return header.kind == Kind::utf16 && utf16Equals(header.units(), text);
 }
 
@@ -85,7 +83,8 @@ public:
         return *object >= std::byte{headOf} && *object < std::byte{headOf | 0xF};
     }
     bool is(const std::byte* object) const {
-        return *object == m_head && std::memcmp(object + 1, m_text.data(), m_text.size()) == 0;
+        const auto* const start = reinterpret_cast<const char*>(object + 1);
+        return *object == m_head && std::string_view(start, m_text.size()) == m_text;
     }
 
 private:

@@ -73,6 +73,22 @@ TEST(Value, LooksUpKeysAndTextsThatAreNotASCII) {
     EXPECT_TRUE(value["клю"].isNil());
 }
 
+TEST(Value, LooksKeysUpWhateverTheirLength) {
+    constexpr std::size_t sizes[] = {0, 1, 13, 14, 15, 16, 300};
+    Dictionary lengths;
+    for (const std::size_t size : sizes)
+        lengths.set(std::string(size, 'k'), size);
+    const Value value = reread(lengths);
+    for (const std::size_t size : sizes) {
+        EXPECT_EQ(value[std::string(size, 'k')], Value(size));
+        EXPECT_TRUE(value[std::string(size, 'k') + 'l'].isNil());
+    }
+    EXPECT_EQ(value[{}], Value(0));
+    const Value spelledLong =
+        parsed(RawFile{{RawFile::dictionary({1, 2}), "\x5F\x10\x01k", "\x10\x07"}}.build());
+    EXPECT_EQ(spelledLong["k"], Value(7));
+}
+
 TEST(Value, DescribesForPeople) {
     EXPECT_EQ(Value().description(), "(null)");
     EXPECT_EQ(Value(false).description(), "0");

@@ -128,6 +128,7 @@ inline std::vector<RawPacket> BadPackets() {
     const auto memoryHeader = RawHeader({.flags = inMemory, .payloadLength = 7});
     const std::string tooLong(platform::maximalInlinePayload + 1, 'x');
     std::vector<RawPacket> packets{
+        {"half a header", RawHeader({}).substr(0, sizeof(PacketHeader) / 2)},
         {"another magic", RawHeader({.magic = {'K', 'X', 'P', 'D'}})},
         {"another version", RawHeader({.version = 2})},
         {"an unknown flag", RawHeader({.flags = 32})},

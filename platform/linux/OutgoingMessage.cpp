@@ -24,8 +24,6 @@
 namespace platform {
 
 Sending SendPacket(int socket, std::span<iovec> parts, const PacketMemory& memory) {
-    // The simpler call costs a tenth less.
-    const bool isOneRun = parts.size() == 1 && !memory;
     msghdr packet = {};
     packet.msg_iov = parts.data();
     packet.msg_iovlen = parts.size();
@@ -39,10 +37,7 @@ Sending SendPacket(int socket, std::span<iovec> parts, const PacketMemory& memor
         *rights = {CMSG_LEN(sizeof descriptor), SOL_SOCKET, SCM_RIGHTS};
         std::memcpy(CMSG_DATA(rights), &descriptor, sizeof descriptor);
     }
-    const auto sent = Uninterrupted([&] {
-        return isOneRun ? ::send(socket, parts.front().iov_base, parts.front().iov_len, sendFlags)
-                        : sendmsg(socket, &packet, sendFlags);
-    });
+    const auto sent = Uninterrupted([&] { return sendmsg(socket, &packet, sendFlags); });
     return sent < 0 ? SendingFromErrno() : Sending::taken;
 }
 
@@ -79,34 +74,35 @@ Sending OutgoingMessage::send(int socket, const PacketHeader& header) const {
     std::array<std::byte, 1024> small;
     const auto length = sizeof header + size() - sizeInMemory();
     if (!m_memory && length <= small.size()) {
-        std::memcpy(small.data(), &header, sizeof header);
-        auto* end = small.data() + sizeof header;
-        for (const auto piece : m_pieces)
-            end = std::ranges::copy(piece, end).out;
-        iovec all{small.data(), length};
-        return SendPacket(socket, {&all, 1}, nullptr);
+        auto* end = small.data();
+        forEachPart(header, [&](std::span<const std::byte> part) { end = std::ranges::copy(part, end).out; });
+        return SendBytes(socket, {small.data(), end});
     }
-    std::array<iovec, 8> few;
-    std::vector<iovec> many;
-    std::vector<std::byte> joined;
-    auto* const parts = m_pieces.size() < few.size() ? few.data() : (many.resize(IOV_MAX), many.data());
-    auto* end = parts;
-    if (m_pieces.size() < IOV_MAX) {
-        *end++ = {const_cast<PacketHeader*>(&header), sizeof header};
-        for (const auto piece : m_pieces)
-            *end++ = {const_cast<std::byte*>(piece.data()), piece.size()};
-    } else {
+    if (m_pieces.size() >= IOV_MAX) {
+        std::vector<std::byte> joined;
+        joined.reserve(length);
         append(header, joined);
-        *end++ = {joined.data(), joined.size()};
+        return SendBytes(socket, joined);
     }
-    return SendPacket(socket, {parts, end}, m_memory);
+    std::vector<iovec> parts;
+    parts.reserve(m_pieces.size() + 1);
+    forEachPart(header, [&](std::span<const std::byte> part) {
+        parts.push_back({const_cast<std::byte*>(part.data()), part.size()});
+    });
+    return SendPacket(socket, parts, m_memory);
 }
 
 void OutgoingMessage::append(const PacketHeader& header, std::vector<std::byte>& bytes) const {
-    const auto* const start = reinterpret_cast<const std::byte*>(&header);
-    bytes.insert(bytes.end(), start, start + sizeof header);
+    forEachPart(header, [&](std::span<const std::byte> part) {
+        bytes.insert(bytes.end(), part.begin(), part.end());
+    });
+}
+
+template <class Take>
+void OutgoingMessage::forEachPart(const PacketHeader& header, const Take& take) const {
+    take(std::as_bytes(std::span(&header, 1)));
     for (const auto piece : m_pieces)
-        bytes.insert(bytes.end(), piece.begin(), piece.end());
+        take(piece);
 }
 
 } // namespace platform

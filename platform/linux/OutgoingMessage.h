@@ -17,7 +17,7 @@ namespace platform {
 /// What goes along with a packet in memory; null with one that is inline.
 using PacketMemory = std::shared_ptr<const Descriptor>;
 
-/// Sends a packet made of these parts. Never blocks.
+/// Sends a packet gathered from these parts. Never blocks.
 Sending SendPacket(int socket, std::span<iovec> parts, const PacketMemory& memory);
 
 /// A message on its way out. Borrows what goes inline.
@@ -47,6 +47,8 @@ public:
 private:
     Sending send(int socket, const PacketHeader& header) const;
     void append(const PacketHeader& header, std::vector<std::byte>& bytes) const;
+    template <class Take>
+    void forEachPart(const PacketHeader& header, const Take& take) const;
 
     PacketHeader m_header;
     BytePieces m_pieces;

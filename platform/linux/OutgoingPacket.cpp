@@ -2,11 +2,13 @@
 
 #include "platform/Clock.h"
 #include "platform/linux/OutgoingMessage.h"
+#include "platform/linux/PortCalls.h"
 #include "platform/linux/PortPacket.h"
 
 #include <algorithm>
 #include <cstddef>
 #include <cstring>
+#include <span>
 #include <sys/uio.h>
 
 namespace platform {
@@ -39,7 +41,9 @@ void OutgoingPacket::removeLast() {
 }
 
 Sending OutgoingPacket::send(int socket) const {
-    iovec part{const_cast<std::byte*>(m_bytes.data()) + m_begin, m_bytes.size() - m_begin};
+    const auto bytes = std::span(m_bytes).subspan(m_begin);
+    if (!m_memory) return SendBytes(socket, bytes);
+    iovec part{const_cast<std::byte*>(bytes.data()), bytes.size()};
     return SendPacket(socket, {&part, 1}, m_memory);
 }
 

@@ -9,6 +9,7 @@
 #include <cstdint>
 #include <cstring>
 #include <memory>
+#include <span>
 #include <sys/socket.h>
 
 namespace platform {
@@ -34,8 +35,7 @@ Sending SendAnswer(int socket, std::uint64_t sequence) {
     PacketHeader header;
     header.flags = PacketHeader::isAnswer;
     header.sequence = sequence;
-    const auto sent = Uninterrupted([&] { return ::send(socket, &header, sizeof header, sendFlags); });
-    return sent < 0 ? SendingFromErrno() : Sending::taken;
+    return SendBytes(socket, std::as_bytes(std::span(&header, 1)));
 }
 
 Reading DrainAnswers(int socket) {
